@@ -1,0 +1,38 @@
+// Platform: what this process has of the platform's services, one accessor a service.
+//
+// Every accessor answers the same object for the whole life of the process, made on first use.
+// Programs get the real services (platform/linux), unit tests get fakes (tests/fakes); which one
+// is decided by linking. Each accessor is defined beside its implementation, so that a program
+// links only what it calls.
+//
+// Threads: any.
+
+#pragma once
+
+namespace vlm::platform {
+
+class Accounts;
+class ConsoleSessions;
+class Keychain;
+class Localization;
+class NamedServiceIpc;
+class ProcessInfo;
+class Sandbox;
+class SystemLog;
+
+class Platform {
+public:
+    Accounts& accounts();
+    ConsoleSessions& consoleSessions();
+    Keychain& keychain();
+    Localization& localization();
+    NamedServiceIpc& namedServiceIpc();
+    ProcessInfo& processInfo();
+    Sandbox& sandbox();
+    SystemLog& systemLog();
+};
+
+// The platform of this process.
+Platform& current();
+
+}  // namespace vlm::platform
