@@ -1,0 +1,71 @@
+#pragma once
+
+#include <algorithm>
+#include <functional>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "services/hints/pairing_store.h"
+#include "services/hints/status.h"
+
+namespace vlm::fakes {
+
+class FakePairingStore final : public service::PairingStore {
+public:
+    // What a test does to the world.
+    void breakDown(const std::string& why) {
+        _broken = service::Refusal{service::status::kStoreFailed, why};
+    }
+
+    // What is in it, the latest last.
+    const std::vector<service::Pairing>& all() const { return _pairings; }
+
+    std::optional<service::Refusal> pair(const std::string& account, const platform::Bytes& hash,
+                                         std::int64_t now) override {
+        if (_broken) return _broken;
+        remove(account, hash);
+        _pairings.push_back({account, hash, ++_last, now});
+        return std::nullopt;
+    }
+    service::Outcome<bool> unpair(const std::string& account,
+                                  const platform::Bytes& hash) override {
+        if (_broken) return *_broken;
+        return remove(account, hash);
+    }
+    service::Outcome<std::vector<service::Pairing>> pairingsOf(
+        const std::string& account) override {
+        return latestFirst([&](const auto& pairing) { return pairing.account == account; });
+    }
+    service::Outcome<std::vector<service::Pairing>> pairingsWith(
+        const platform::Bytes& hash) override {
+        return latestFirst([&](const auto& pairing) { return pairing.hash == hash; });
+    }
+    service::Outcome<bool> isPaired(const std::string& account) override {
+        const auto found = pairingsOf(account);
+        if (!found) return found.refusal();
+        return !found->empty();
+    }
+
+private:
+    bool remove(const std::string& account, const platform::Bytes& hash) {
+        return std::erase_if(_pairings, [&](const auto& pairing) {
+                   return pairing.account == account && pairing.hash == hash;
+               }) > 0;
+    }
+
+    service::Outcome<std::vector<service::Pairing>> latestFirst(
+        const std::function<bool(const service::Pairing&)>& matches) {
+        if (_broken) return *_broken;
+        std::vector<service::Pairing> found;
+        std::ranges::copy_if(_pairings, std::back_inserter(found), matches);
+        std::ranges::reverse(found);
+        return found;
+    }
+
+    std::vector<service::Pairing> _pairings;
+    std::int64_t _last = 0;
+    std::optional<service::Refusal> _broken;
+};
+
+}  // namespace vlm::fakes

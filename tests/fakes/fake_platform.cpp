@@ -1,0 +1,39 @@
+#include "fake_platform.h"
+
+#include <cassert>
+
+#include "platform/platform.h"
+
+namespace vlm::fakes {
+
+namespace {
+FakePlatform* installed = nullptr;
+}
+
+FakePlatform::FakePlatform() {
+    assert(!installed);
+    installed = this;
+}
+
+FakePlatform::~FakePlatform() { installed = nullptr; }
+
+}  // namespace vlm::fakes
+
+namespace vlm::platform {
+
+Accounts& Platform::accounts() { return *fakes::installed->accounts; }
+ConsoleSessions& Platform::consoleSessions() { return *fakes::installed->consoleSessions; }
+Keychain& Platform::keychain() { return *fakes::installed->keychain; }
+Localization& Platform::localization() { return *fakes::installed->localization; }
+NamedServiceIpc& Platform::namedServiceIpc() { return *fakes::installed->namedServiceIpc; }
+ProcessInfo& Platform::processInfo() { return *fakes::installed->processInfo; }
+Sandbox& Platform::sandbox() { return *fakes::installed->sandbox; }
+SystemLog& Platform::systemLog() { return *fakes::installed->systemLog; }
+
+Platform& current() {
+    static Platform platform;
+    assert(fakes::installed);
+    return platform;
+}
+
+}  // namespace vlm::platform

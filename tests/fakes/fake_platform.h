@@ -1,0 +1,45 @@
+// The platform of unit tests. While a FakePlatform exists, platform::current() answers its fakes;
+// a test may put a service of its own in a fake's place. One at a time.
+
+#pragma once
+
+#include "fake_accounts.h"
+#include "fake_console_sessions.h"
+#include "fake_keychain.h"
+#include "fake_localization.h"
+#include "fake_named_service_ipc.h"
+#include "fake_process_info.h"
+#include "fake_sandbox.h"
+#include "recording_system_log.h"
+
+namespace vlm::fakes {
+
+class FakePlatform {
+public:
+    FakePlatform();
+    ~FakePlatform();
+    FakePlatform(const FakePlatform&) = delete;
+    FakePlatform& operator=(const FakePlatform&) = delete;
+
+    // The fakes, for a test to set up and to look at.
+    FakeAccounts fakeAccounts;
+    FakeConsoleSessions fakeConsoleSessions;
+    FakeKeychain fakeKeychain;
+    FakeLocalization fakeLocalization;
+    FakeNamedServiceIpc fakeNamedServiceIpc;
+    FakeProcessInfo fakeProcessInfo;
+    FakeSandbox fakeSandbox;
+    RecordingSystemLog recordingSystemLog;
+
+    // What the code under test gets.
+    platform::Accounts* accounts = &fakeAccounts;
+    platform::ConsoleSessions* consoleSessions = &fakeConsoleSessions;
+    platform::Keychain* keychain = &fakeKeychain;
+    platform::Localization* localization = &fakeLocalization;
+    platform::NamedServiceIpc* namedServiceIpc = &fakeNamedServiceIpc;
+    platform::ProcessInfo* processInfo = &fakeProcessInfo;
+    platform::Sandbox* sandbox = &fakeSandbox;
+    platform::SystemLog* systemLog = &recordingSystemLog;
+};
+
+}  // namespace vlm::fakes
