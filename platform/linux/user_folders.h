@@ -1,0 +1,31 @@
+// The effective user's private folders: where they may be, and how one is made safely.
+//
+// Threads:  any; the environment must not change meanwhile.
+// Blocking: no more than the file system does.
+// Errors:   a place that cannot be trusted is passed over for the next one; when none is left, the
+//           answer is the system's error number of the last one.
+// In tests: tests/integration/sandbox/user_folders_test.cpp
+
+#pragma once
+
+#include <optional>
+#include <string>
+
+#include "platform/sandbox.h"
+
+namespace vlm::platform {
+
+// The places that the environment and the accounts name, none for what they leave out.
+struct UserPlaces {
+    std::optional<std::string> runtimeFolder;  // XDG_RUNTIME_DIR
+    std::optional<std::string> cacheHome;      // XDG_CACHE_HOME
+    std::optional<std::string> home;           // HOME
+    std::optional<std::string> accountHome;    // of the effective user's account
+
+    static UserPlaces ofThisProcess();
+};
+
+FolderAnswer userTemporaryFolder(const UserPlaces& places);
+FolderAnswer userCacheFolder(const UserPlaces& places);
+
+}  // namespace vlm::platform
