@@ -58,8 +58,7 @@ public:
         ++listings;
         _due.emplace_back([this, answer = std::move(answer)] { answer(_tokens); });
     }
-    void prove(service::ProofRequest request,
-               std::function<void(service::Proof)> answer) override {
+    void prove(service::ProofRequest request, std::function<void(service::Proof)> answer) override {
         pinsTried.emplace_back(request.pin.text());
         challenges.push_back(request.challenge);
         const auto proof = proofFor(request);
