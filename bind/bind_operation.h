@@ -1,0 +1,138 @@
+// BindOperation: one attempt to pair a user with an identity of an inserted smart card.
+//
+// Shapes:    a token is named by its identifier, a key by its public-key hash.
+// Ownership: shared; background work, timers and handlers hold an operation weakly.
+// Threads:   the two maps of the token cache are shared with the token watcher's thread and with
+//            the windows': each is published whole, and a reader keeps the version it got. The
+//            other fields belong to whoever runs the operation.
+// Blocking:  whatever asks the hints service waits for its answer, and that may be a person's PIN.
+// Errors:    a status, 0 for success, beside an error in the caller's place. An operation's own
+//            refusals are kRefused in VLErrorDomain; every other status is a service's.
+// In tests:  tests/unit/bind
+
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "bind/snapshot.h"
+#include "bind/token_info.h"
+#include "platform/property_list.h"
+#include "platform/types.h"
+
+namespace vlm::platform {
+class TokenWatcher;
+}
+
+namespace vlm {
+
+class PairingDialog;
+
+// How an operation ended.
+enum class BindResult : std::int32_t {
+    Succeeded = 0,
+    Failed = 1,
+    Canceled = 2,
+    NotOffered = 3,
+};
+
+class BindOperation : public std::enable_shared_from_this<BindOperation> {
+public:
+    using Bytes = platform::Bytes;
+    using ErrorPlace = platform::ErrorPlace;
+    using OptionalHash = std::optional<Bytes>;
+    using OptionalText = std::optional<std::string>;
+    using Reply = std::function<void(BindResult, const std::optional<platform::Error>&)>;
+
+    using DisplayNames = std::map<Bytes, std::string>;               // by public-key hash
+    using UnpairedIdentities = std::map<std::string, DisplayNames>;  // by token
+    using WrapKeysHashMap = std::map<Bytes, std::string>;            // token by wrap key's hash
+
+    // The status of what an operation refuses itself.
+    static constexpr platform::Status kRefused = -8;
+
+    // For the user who sits at this machine.
+    static std::shared_ptr<BindOperation> init();
+
+    static std::shared_ptr<BindOperation> initWithUserName(OptionalText userName);
+
+    ~BindOperation();
+    BindOperation(const BindOperation&) = delete;
+    BindOperation& operator=(const BindOperation&) = delete;
+
+    // What the hints service tells about one token, or about all; TokenInfo reads it.
+    std::optional<platform::PropertyList> tokenData(const OptionalText& token) const;
+
+    // Adds what can be paired on one token to the cache, or makes the cache anew for all tokens.
+    // A token without a key that can wrap an unlock key is left out when one is required.
+    void _updateTokenCache(const OptionalText& token, bool requireWrapKey);
+
+    // The hash of the key on this token that can wrap an unlock key.
+    OptionalHash wrapKeyForTokenId(const std::string& token) const;
+
+    // What the token watcher tells.
+    void tokenInserted(const std::string& token);
+    void tokenRemoved(const std::string& token);
+
+    // The token that holds this key among the cached ones that can be paired.
+    OptionalText tokenIdForUnpairedPubKeyHash(const OptionalHash& publicKeyHash) const;
+
+    // Whether any key of the card that holds this one is paired; asks the hints service.
+    bool _isSmartCardPaired(const OptionalHash& publicKeyHash) const;
+
+    // Logs in to the card with the key and pairs the operation's user with it.
+    platform::Status pairUser(const OptionalHash& publicKeyHash, bool requireWrapKey,
+                              ErrorPlace error);
+
+    // Undoes a pairing of the named user, or of the operation's own when none is named. The unlock
+    // key goes too when it is the operation's own user; failing to erase it is no failure.
+    platform::Status unpairUser(const OptionalHash& publicKeyHash, const OptionalText& userName,
+                                ErrorPlace error);
+
+    // Stores the key that opens the user's login keyring after a login with this card. This
+    // version cannot do that yet, and always refuses.
+    platform::Status storeUnlockKey(const OptionalHash& publicKeyHash, ErrorPlace error);
+
+    // The maps: null, or none to set, when absent; an absent map counts as an empty one in every
+    // look-up, but a pairing fills the cache only when it is absent.
+    std::shared_ptr<const WrapKeysHashMap> wrapKeysHashMap() const;
+    void setWrapKeysHashMap(std::optional<WrapKeysHashMap> wrapKeysHashMap);
+    std::shared_ptr<const UnpairedIdentities> unpairedIdentities() const;
+    void setUnpairedIdentities(std::optional<UnpairedIdentities> unpairedIdentities);
+
+    const Reply& reply() const { return _reply; }
+    void setReply(Reply reply) { _reply = std::move(reply); }
+    const std::shared_ptr<PairingDialog>& dialog() const { return _dialog; }
+    void setDialog(std::shared_ptr<PairingDialog> dialog) { _dialog = std::move(dialog); }
+    const std::shared_ptr<platform::TokenWatcher>& tokenWatcher() const { return _tokenWatcher; }
+    void setTokenWatcher(std::shared_ptr<platform::TokenWatcher> tokenWatcher) {
+        _tokenWatcher = std::move(tokenWatcher);
+    }
+    const OptionalText& userName() const { return _userName; }
+    void setUserName(OptionalText userName) { _userName = std::move(userName); }
+
+private:
+    explicit BindOperation(OptionalText userName);
+
+    UnpairedIdentities offeredIdentities(const TokenInfo& info,
+                                         const std::vector<std::string>& candidates,
+                                         bool requireWrapKey) const;
+    platform::Status loginAndBind(const std::string& token, const OptionalHash& publicKeyHash,
+                                  ErrorPlace error) const;
+    platform::Status refusePairing(const OptionalHash& publicKeyHash, ErrorPlace error) const;
+    void eraseUnlockKey(const OptionalHash& publicKeyHash, const OptionalText& user) const;
+
+    Snapshot<WrapKeysHashMap> _wrapKeysHashMap;
+    Snapshot<UnpairedIdentities> _unpairedIdentities;
+    Reply _reply;
+    std::shared_ptr<PairingDialog> _dialog;
+    std::shared_ptr<platform::TokenWatcher> _tokenWatcher;
+    OptionalText _userName;
+};
+
+}  // namespace vlm
