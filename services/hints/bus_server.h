@@ -1,0 +1,65 @@
+// BusServer: one method, `a{sv}` in and `a{sv}` out, of the hints service's object on a bus.
+//
+// Who calls is asked of the bus. Answers may come in any order and at any time; a caller that has
+// left gets none. There is a bound on the requests that wait for their answers, for each user and
+// in all, so that nobody can use up this program's memory or keep others out.
+//
+// Ownership: the bus and the exchanges outlive it. Threads: the event loop's.
+// Blocking:  asks the bus once a request.
+// Errors:    a message that is no such dictionary is refused like any other bad request.
+// In tests:  tests/integration/service/bus_server_test.cpp
+
+#pragma once
+
+#include <systemd/sd-bus.h>
+
+#include <array>
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "platform/linux/sd_bus_handles.h"
+#include "services/hints/exchanges.h"
+#include "services/hints/outcome.h"
+
+namespace vlm::service {
+
+class BusServer {
+public:
+    static constexpr std::size_t kMostWaitingOfOneUser = 64;
+    static constexpr std::size_t kMostWaiting = 512;
+
+    // The names are literals.
+    BusServer(sd_bus* bus, const char* interface, const char* method, Exchanges& exchanges);
+    BusServer(const BusServer&) = delete;
+    BusServer& operator=(const BusServer&) = delete;
+
+    // Puts the method on the bus. False when the bus does not take it.
+    bool start();
+
+private:
+    struct Waiting {
+        platform::SdBusMessage call;
+        platform::UserId user;
+    };
+
+    static int onCall(sd_bus_message* call, void* self, sd_bus_error* error);
+    void receive(sd_bus_message* call);
+    std::optional<Refusal> refuseMore(platform::UserId user) const;
+    void send(sd_bus_message* call, const platform::Message& content);
+
+    sd_bus* _bus;
+    const char* _interface;
+    Exchanges& _exchanges;
+    std::array<sd_bus_vtable, 3> _members;
+    platform::SdBusSlot _slot;
+    std::map<std::uint64_t, Waiting> _waiting;
+    std::uint64_t _last = 0;
+
+    // Answers that come after the server is gone find this gone, too.
+    std::shared_ptr<int> _alive = std::make_shared<int>();
+};
+
+}  // namespace vlm::service

@@ -1,0 +1,114 @@
+#include "services/hints/child_program.h"
+
+#include <fcntl.h>
+#include <grp.h>
+#include <linux/close_range.h>
+#include <sys/prctl.h>
+#include <sys/resource.h>
+#include <sys/socket.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+#include <utility>
+
+#include "platform/text.h"
+#include "services/hints/shown_text.h"
+#include "services/hints/status.h"
+
+namespace vlm::service {
+
+namespace {
+
+// The next lines run in the child, between fork and exec.
+
+void becomeUser(uid_t user, gid_t group) {
+    if (setgroups(1, &group) != 0 || setresgid(group, group, group) != 0 ||
+        setresuid(user, user, user) != 0)
+        _exit(127);
+}
+
+void takeDefaultSignals() {
+    struct sigaction usual = {};
+    usual.sa_handler = SIG_DFL;
+    for (int number = 1; number < NSIG; ++number) sigaction(number, &usual, nullptr);
+    sigset_t none;
+    sigemptyset(&none);
+    sigprocmask(SIG_SETMASK, &none, nullptr);
+}
+
+void takeStreams(int socket) {
+    const int nothing = open("/dev/null", O_RDWR | O_CLOEXEC);
+    if (nothing < 0 || dup2(socket, STDIN_FILENO) < 0 || dup2(socket, STDOUT_FILENO) < 0 ||
+        dup2(nothing, STDERR_FILENO) < 0)
+        _exit(127);
+    // A kernel without it has to trust that every descriptor is marked close-on-exec.
+    syscall(SYS_close_range, STDERR_FILENO + 1, ~0U, 0);
+}
+
+[[noreturn]] void runInChild(const ProgramToRun& program, int socket, char* const* environment) {
+    takeDefaultSignals();
+    takeStreams(socket);
+    setsid();
+    const rlimit noCore = {0, 0};
+    setrlimit(RLIMIT_CORE, &noCore);
+    if (program.user) becomeUser(*program.user, program.group);
+    prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
+    // After the change of user, which forgets it.
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
+    std::string path = program.path;
+    char* arguments[] = {path.data(), nullptr};
+    execve(path.c_str(), arguments, environment);
+    _exit(127);
+}
+
+Refusal failed(const ProgramToRun& program, int error) {
+    return {status::kNoPin, platform::text("the program {} cannot be run ({})",
+                                           shownText(program.path), std::strerror(error))};
+}
+
+}  // namespace
+
+Outcome<ChildProgram> ChildProgram::start(const ProgramToRun& program) {
+    if (access(program.path.c_str(), X_OK) != 0) return failed(program, errno);
+    int ends[2];
+    if (socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends) != 0)
+        return failed(program, errno);
+    platform::FileDescriptor ours(ends[0]);
+    const platform::FileDescriptor theirs(ends[1]);
+    fcntl(ours.get(), F_SETFL, O_NONBLOCK);
+
+    auto environment = program.environment;
+    std::vector<char*> pointers;
+    for (auto& entry : environment) pointers.push_back(entry.data());
+    pointers.push_back(nullptr);
+
+    const pid_t process = fork();
+    if (process < 0) return failed(program, errno);
+    if (process == 0) runInChild(program, theirs.get(), pointers.data());
+    return ChildProgram(process, std::move(ours));
+}
+
+ChildProgram::ChildProgram(pid_t process, platform::FileDescriptor socket)
+    : _process(process), _socket(std::move(socket)) {}
+
+ChildProgram::ChildProgram(ChildProgram&& other) noexcept
+    : _process(std::exchange(other._process, -1)), _socket(std::move(other._socket)) {}
+
+ChildProgram& ChildProgram::operator=(ChildProgram&& other) noexcept {
+    std::swap(_process, other._process);
+    std::swap(_socket, other._socket);
+    return *this;
+}
+
+ChildProgram::~ChildProgram() {
+    if (_process <= 0) return;
+    kill(_process, SIGKILL);
+    while (waitpid(_process, nullptr, 0) < 0 && errno == EINTR) {
+    }
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,67 @@
+// HintsService: what the daemon answers, decided here.
+//
+// Every reply follows README.md. A refusal has its status in "res" and an error entry with a
+// sentence; each is one log line, as is each change of a pairing.
+//
+// Ownership: its parts outlive it. Threads: the event loop's. Blocking: for the pairings only.
+// In tests:  tests/unit/services/hints_service_test.cpp
+
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <memory>
+#include <vector>
+
+#include "services/hints/caller.h"
+#include "services/hints/exchanges.h"
+#include "services/hints/login.h"
+#include "services/hints/pairing_store.h"
+#include "services/hints/proofs.h"
+#include "services/hints/token_info.h"
+
+namespace vlm::service {
+
+class HintsService final : public Exchanges {
+public:
+    struct Parts {
+        LoginParts login;
+        PairingStore& pairings;
+        CallerWatch& callers;
+        Proofs::Clock milliseconds;         // never goes back
+        std::function<std::int64_t()> now;  // seconds since 1970-01-01 00:00:00 UTC
+    };
+
+    explicit HintsService(Parts parts) : _parts(std::move(parts)), _proofs(_parts.milliseconds) {}
+
+    void handle(const Caller& caller, const IncomingRequest& request, Reply reply) override;
+
+private:
+    // A login under way, and the watch that ends it when its caller leaves.
+    struct Running {
+        std::shared_ptr<Login> login;
+        std::unique_ptr<CallerWatch::Watch> watch;
+    };
+    using Answer = std::function<void(Outcome<platform::Message>)>;
+
+    void serve(const Caller& caller, Request request, const Answer& answer);
+    void login(const Caller& caller, Request request, const Answer& answer);
+    void describeTokens(const Caller& caller, const Request& request, const Answer& answer);
+    Outcome<platform::Message> describeTokens(const Caller& caller, const std::string& onlyToken,
+                                              const std::vector<Token>& tokens);
+    Outcome<platform::Message> pair(const Caller& caller, const Request& request);
+    Outcome<platform::Message> unpair(const Caller& caller, const Request& request);
+    void listPairings(const Request& request, const Answer& answer);
+    Outcome<platform::Message> isPaired(const Request& request);
+
+    Parts _parts;
+    Proofs _proofs;
+    std::map<std::uint64_t, Running> _logins;
+    std::uint64_t _lastLogin = 0;
+
+    // Answers that come after the service is gone find this gone, too.
+    std::shared_ptr<int> _alive = std::make_shared<int>();
+};
+
+}  // namespace vlm::service

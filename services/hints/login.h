@@ -1,0 +1,73 @@
+// Login: one proof that an inserted card holds a key, from the request to the answer.
+//
+// The card is looked up, the PIN is taken from the request or asked for, the card signs a fresh
+// challenge, and the signature is verified with the public key whose hash was asked for. A PIN is
+// given to the card once, whatever becomes of it.
+//
+// Ownership: by a shared pointer; what comes in for a login that was dropped has no effect, and
+//            dropping one withdraws its PIN prompt.
+// Threads:   the event loop's. Blocking: never.
+// Errors:    the answer is a refusal.
+// In tests:  tests/unit/services/login_test.cpp
+
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "services/hints/caller.h"
+#include "services/hints/outcome.h"
+#include "services/hints/pin_prompt.h"
+#include "services/hints/request.h"
+#include "services/hints/tokens.h"
+
+namespace vlm::service {
+
+// What a login works with; all of it outlives the login.
+struct LoginParts {
+    // Whether the signature over the challenge was made with the key whose public half is given;
+    // false also when the hash is not that key's.
+    using Verify = std::function<bool(const Bytes& publicKeyInfo, const Bytes& publicKeyHash,
+                                      const Bytes& challenge, const Bytes& signature)>;
+    // That many bytes that nobody can foretell; none when there are none to be had.
+    using RandomBytes = std::function<std::optional<Bytes>(std::size_t)>;
+
+    Tokens& tokens;
+    PinPrompt& prompt;
+    Verify verify;
+    RandomBytes randomBytes;
+};
+
+class Login : public std::enable_shared_from_this<Login> {
+public:
+    using Done = std::function<void(std::optional<Refusal>)>;
+
+    // The request is one for a login. `done` is called once, never before start() has returned.
+    Login(const LoginParts& parts, Caller caller, Request request, Done done);
+
+    void start();
+
+private:
+    void choose(const std::vector<Token>& tokens);
+    void askForPin();
+    void takePin(PinAnswer answer);
+    void prove(Secret pin);
+    void judge(const Proof& proof);
+    std::string attempt() const;
+    void refuse(platform::Status status, const std::string& why);
+
+    const LoginParts& _parts;
+    const Caller _caller;
+    Request _request;
+    Done _done;
+
+    Token _token;
+    Identity _identity;
+    Bytes _challenge;
+    std::unique_ptr<PinPrompt::Question> _question;
+};
+
+}  // namespace vlm::service

@@ -1,0 +1,60 @@
+#include "services/hints/pairing_schema.h"
+
+#include <SQLiteCpp/Transaction.h>
+
+#include <array>
+
+#include "platform/text.h"
+
+namespace vlm::service {
+
+namespace {
+
+// "vlmp": tells our database from any other.
+constexpr int kApplication = 0x766C6D70;
+
+// Each step takes a database from the version that is its place in the list to the next one. A
+// step that was released is never changed.
+constexpr std::array kSteps = {
+    // AUTOINCREMENT: a sequence is never used again, so that the latest pairing is the one with
+    // the largest, also after the latest was removed.
+    R"(CREATE TABLE pairing (
+           sequence INTEGER PRIMARY KEY AUTOINCREMENT,
+           account TEXT NOT NULL CHECK (account <> ''),
+           hash BLOB NOT NULL CHECK (typeof(hash) = 'blob' AND length(hash) = 32),
+           paired_at INTEGER NOT NULL,
+           UNIQUE (account, hash)
+       );
+       CREATE INDEX pairing_by_hash ON pairing (hash);)",
+};
+
+int number(SQLite::Database& database, const char* query) {
+    return database.execAndGet(query).getInt();
+}
+
+}  // namespace
+
+std::optional<std::string> migratePairings(SQLite::Database& database) {
+    SQLite::Transaction transaction(database, SQLite::TransactionBehavior::IMMEDIATE);
+    const auto application = number(database, "PRAGMA application_id");
+    const auto version = number(database, "PRAGMA user_version");
+    const bool isEmpty = number(database, "SELECT count(*) FROM sqlite_master") == 0;
+    const bool isNew = isEmpty && application == 0 && version == 0;
+    if (!isNew && application != kApplication)
+        return "it is the database of another program. Move it away or give another path";
+    if (version < 0 || static_cast<std::size_t>(version) > kSteps.size())
+        return platform::text(
+            "its version is {}, and this program knows versions up to {}. "
+            "Install the newer program again",
+            version, kSteps.size());
+    if (static_cast<std::size_t>(version) == kSteps.size()) return std::nullopt;
+
+    for (auto step = static_cast<std::size_t>(version); step < kSteps.size(); ++step)
+        database.exec(kSteps[step]);
+    database.exec(platform::text("PRAGMA application_id = {}", kApplication));
+    database.exec(platform::text("PRAGMA user_version = {}", kSteps.size()));
+    transaction.commit();
+    return std::nullopt;
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,166 @@
+#include "services/hints/pinentry_dialog.h"
+
+#include <charconv>
+#include <utility>
+
+#include "platform/text.h"
+#include "services/hints/shown_text.h"
+
+namespace vlm::service {
+
+namespace {
+
+// The protocol allows lines of 1000 bytes; this many characters of a name fit beside the rest.
+constexpr std::size_t kMostNameCharacters = 64;
+
+// The low half of an error number is the error, the rest tells which program made it.
+constexpr unsigned kErrorMask = 0xFFFF;
+constexpr unsigned kTimedOut = 62;
+constexpr unsigned kCancelled = 99;
+constexpr unsigned kFullyCancelled = 198;
+
+std::string escaped(std::string_view text) {
+    std::string line;
+    for (const char each : text) {
+        if (each == '%')
+            line += "%25";
+        else if (each == '\n')
+            line += "%0A";
+        else if (each == '\r')
+            line += "%0D";
+        else
+            line += each;
+    }
+    return line;
+}
+
+std::string_view warning(PinState state) {
+    switch (state) {
+        case PinState::FewTriesLeft:
+            return "\n\nA wrong PIN was entered before.";
+        case PinState::LastTry:
+            return "\n\nThis is the last try: after another wrong PIN the card is locked.";
+        case PinState::Ready:
+        case PinState::Locked:
+            break;
+    }
+    return {};
+}
+
+std::string description(const PinQuestion& question) {
+    return platform::text(
+        "Enter the PIN of the card \"{}\". The card then proves that it holds the identity "
+        "\"{}\".{}",
+        shownText(question.card, kMostNameCharacters),
+        shownText(question.identity, kMostNameCharacters), warning(question.state));
+}
+
+// One word of a line, taken off its head.
+std::string_view takeWord(std::string_view& line) {
+    const auto end = std::min(line.find(' '), line.size());
+    const auto word = line.substr(0, end);
+    line.remove_prefix(std::min(end + 1, line.size()));
+    return word;
+}
+
+int hexadecimalDigit(char digit) {
+    if (digit >= '0' && digit <= '9') return digit - '0';
+    if (digit >= 'A' && digit <= 'F') return digit - 'A' + 10;
+    if (digit >= 'a' && digit <= 'f') return digit - 'a' + 10;
+    return -1;
+}
+
+}  // namespace
+
+PinentryDialog::PinentryDialog(const PinQuestion& question,
+                               const std::optional<PinentryTerminal>& terminal) {
+    if (terminal) {
+        _commands.push_back("OPTION ttyname=" + escaped(terminal->path));
+        _commands.push_back("OPTION ttytype=" + escaped(terminal->type));
+    }
+    _commands.push_back("OPTION lc-ctype=C.UTF-8");
+    _commands.push_back(platform::text("SETTIMEOUT {}", kPatienceSeconds));
+    _commands.push_back("SETTITLE Smart card");
+    _commands.push_back("SETDESC " + escaped(description(question)));
+    _commands.push_back("SETPROMPT PIN:");
+    _commands.push_back("GETPIN");
+}
+
+PinentryDialog::~PinentryDialog() { wipeMemory(_pin); }
+
+std::string PinentryDialog::take(std::string_view line) {
+    if (_isOver) return {};
+    const auto word = takeWord(line);
+    const bool isAsked = _sent == _commands.size();
+    if (word == "D" && isAsked) collect(line);
+    if (word == "OK") {
+        if (!isAsked) return next();
+        end(_isTooLong ? PinAnswer::Outcome::Unavailable : PinAnswer::Outcome::Given,
+            "the PIN that was entered is too long");
+    }
+    if (word == "ERR") {
+        // A program that does not know an option asks all the same.
+        if (!isAsked && _sent > 0) return next();
+        endWithError(line);
+    }
+    if (word == "INQUIRE") return "CAN\n";
+    return {};
+}
+
+void PinentryDialog::breakOff(const std::string& reason) {
+    if (!_isOver) end(PinAnswer::Outcome::Unavailable, reason);
+}
+
+PinAnswer PinentryDialog::takeAnswer() { return std::move(_answer); }
+
+std::string PinentryDialog::next() { return _commands[_sent++] + "\n"; }
+
+void PinentryDialog::collect(std::string_view data) {
+    for (std::size_t at = 0; at < data.size(); ++at) {
+        char each = data[at];
+        if (each == '%' && at + 2 < data.size()) {
+            const int high = hexadecimalDigit(data[at + 1]);
+            const int low = hexadecimalDigit(data[at + 2]);
+            if (high >= 0 && low >= 0) {
+                each = static_cast<char>(high * 16 + low);
+                at += 2;
+            }
+        }
+        if (_pinSize == _pin.size()) {
+            _isTooLong = true;
+            return;
+        }
+        _pin[_pinSize++] = each;
+    }
+}
+
+void PinentryDialog::end(PinAnswer::Outcome outcome, std::string reason) {
+    _isOver = true;
+    _answer.outcome = outcome;
+    _answer.reason = std::move(reason);
+    if (outcome != PinAnswer::Outcome::Given) return;
+    _answer.reason.clear();
+    // Nothing was typed: no card has such a PIN, and for a card it means that its reader asks.
+    if (_pinSize == 0)
+        _answer.outcome = PinAnswer::Outcome::Cancelled;
+    else
+        _answer.pin = Secret(std::string_view(_pin.data(), _pinSize));
+}
+
+void PinentryDialog::endWithError(std::string_view error) {
+    unsigned number = 0;
+    const auto word = takeWord(error);
+    std::from_chars(word.data(), word.data() + word.size(), number);
+    switch (number & kErrorMask) {
+        case kCancelled:
+        case kFullyCancelled:
+            return end(PinAnswer::Outcome::Cancelled);
+        case kTimedOut:
+            return end(PinAnswer::Outcome::TimedOut);
+        default:
+            end(PinAnswer::Outcome::Unavailable,
+                platform::text("the pinentry program failed: {}", shownText(error)));
+    }
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,49 @@
+#include "services/hints/prompter_registry.h"
+
+#include <utility>
+
+#include "services/hints/bus_caller.h"
+#include "services/hints/hints_log.h"
+#include "services/hints/service_names.h"
+
+namespace vlm::service {
+
+const sd_bus_vtable PrompterRegistry::kMembers[] = {
+    SD_BUS_VTABLE_START(0),
+    SD_BUS_METHOD("RegisterPrompter", "", "", onRegister, SD_BUS_VTABLE_UNPRIVILEGED),
+    SD_BUS_VTABLE_END,
+};
+
+bool PrompterRegistry::start() {
+    sd_bus_slot* slot = nullptr;
+    if (sd_bus_add_object_vtable(_bus, &slot, kObjectPath, kPromptersInterface, kMembers, this) < 0)
+        return false;
+    _slot.reset(slot);
+    return true;
+}
+
+std::optional<std::string> PrompterRegistry::prompterOf(platform::UserId user) const {
+    const auto found = _prompters.find(user);
+    if (found == _prompters.end()) return std::nullopt;
+    return found->second.connection;
+}
+
+int PrompterRegistry::onRegister(sd_bus_message* call, void* self, sd_bus_error*) {
+    const auto caller = callerOf(call);
+    if (!caller) return 1;
+    static_cast<PrompterRegistry*>(self)->add(caller->user, caller->connection);
+    return sd_bus_reply_method_return(call, nullptr);
+}
+
+void PrompterRegistry::add(platform::UserId user, const std::string& connection) {
+    auto watch = _callers.watch(connection, [this, user, connection] {
+        const auto found = _prompters.find(user);
+        if (found != _prompters.end() && found->second.connection == connection)
+            _prompters.erase(found);
+    });
+    if (!watch) return;
+    _prompters[user] = {connection, std::move(watch)};
+    kLog.info("user {} is asked for PINs through {}", user, connection);
+}
+
+}  // namespace vlm::service

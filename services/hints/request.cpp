@@ -1,0 +1,205 @@
+#include "services/hints/request.h"
+
+#include <algorithm>
+#include <limits>
+#include <utility>
+
+#include "platform/property_list.h"
+#include "platform/text.h"
+#include "services/hints/shown_text.h"
+#include "services/hints/status.h"
+
+namespace vlm::service {
+
+namespace {
+
+constexpr std::size_t kHashSize = 32;
+constexpr std::size_t kMostAccountName = 256;
+constexpr std::size_t kMostTokenIdentifier = 2048;
+constexpr std::size_t kMostPin = 256;
+constexpr std::size_t kMostOtherText = 4096;
+constexpr std::size_t kMostQuery = std::size_t{64} << 10U;
+constexpr platform::PropertyListLimits kQueryLimits = {
+    .depth = 8, .objects = 1024, .bytes = kMostQuery};
+
+// Reads one key after the other and remembers the first one that is wrong.
+class Reader {
+public:
+    explicit Reader(const IncomingRequest& incoming) : _incoming(incoming) {
+        for (const auto key : {"op", "uid", "dat1", "str1", "str2", "str3", "num1"})
+            if (std::ranges::find(incoming.unreadableKeys, key) != incoming.unreadableKeys.end())
+                refuse(platform::text("\"{}\" is there twice, or of a type that no key has", key));
+    }
+
+    std::uint64_t number(std::string_view key) {
+        const auto value = message().unsignedInteger(key);
+        if (!value) missing(key, "an unsigned whole number");
+        return value.value_or(0);
+    }
+
+    platform::UserId user() {
+        const auto value = message().integer("uid");
+        if (!value) return missing("uid", "a signed whole number"), platform::kNobody;
+        if (*value < -1 || *value > std::numeric_limits<platform::UserId>::max())
+            refuse("\"uid\" is no user id");
+        return static_cast<platform::UserId>(*value);
+    }
+
+    bool flag(std::string_view key) {
+        const auto value = message().integer(key);
+        if (!value) return missing(key, "a signed whole number"), false;
+        if (*value != 0 && *value != 1)
+            refuse(platform::text("\"{}\" must be 0 or 1, and is {}", key, *value));
+        return *value == 1;
+    }
+
+    std::string text(std::string_view key, std::size_t most) {
+        const auto* value = optionalText(key, most);
+        if (!value && !_refusal) missing(key, "text");
+        return value ? *value : std::string();
+    }
+
+    const std::string* optionalText(std::string_view key, std::size_t most) {
+        const auto* value = message().text(key);
+        if (!value && isThere(key)) missing(key, "text");
+        if (!value) return nullptr;
+        if (value->empty()) refuse(platform::text("\"{}\" is empty", key));
+        if (value->size() > most)
+            refuse(platform::text("\"{}\" has {} bytes, and {} is the most", key, value->size(),
+                                  most));
+        return value;
+    }
+
+    platform::Bytes hash() {
+        const auto* value = message().bytes("dat1");
+        if (!value) return missing("dat1", "bytes"), platform::Bytes();
+        if (value->size() != kHashSize)
+            refuse(platform::text("\"dat1\" has {} bytes, and a public-key hash has {}",
+                                  value->size(), kHashSize));
+        return *value;
+    }
+
+    // The token that a query of the form {"tokid": token} is restricted to; empty for all tokens.
+    std::string queriedToken() {
+        if (!isThere("dat1")) return {};
+        const auto* bytes = message().bytes("dat1");
+        if (!bytes) return missing("dat1", "bytes"), std::string();
+        if (bytes->size() > kMostQuery)
+            return refuse(platform::text("\"dat1\" has {} bytes, and {} is the most", bytes->size(),
+                                         kMostQuery)),
+                   std::string();
+        const auto list = platform::readPropertyList(*bytes, kQueryLimits);
+        const auto* query = list ? list->dictionary() : nullptr;
+        if (!query) return refuse("\"dat1\" is no dictionary in a property list"), std::string();
+        const auto* token = query->find("tokid");
+        if (!token) return {};
+        if (!token->text() || token->text()->empty() ||
+            token->text()->size() > kMostTokenIdentifier)
+            return refuse("\"tokid\" in \"dat1\" is no token identifier"), std::string();
+        return *token->text();
+    }
+
+    void refuse(const std::string& why) {
+        if (!_refusal)
+            _refusal = Refusal{status::kBadRequest,
+                               platform::text("The request cannot be understood: {}.", why)};
+    }
+
+    const std::optional<Refusal>& refusal() const { return _refusal; }
+
+private:
+    const platform::Message& message() const { return _incoming.message; }
+
+    bool isThere(std::string_view key) const { return message().contains(key); }
+
+    void missing(std::string_view key, std::string_view wanted) {
+        if (isThere(key))
+            refuse(platform::text("\"{}\" must hold {}", key, wanted));
+        else
+            refuse(platform::text("\"{}\" is missing", key));
+    }
+
+    const IncomingRequest& _incoming;
+    std::optional<Refusal> _refusal;
+};
+
+void readLogin(Reader& reader, Request& request) {
+    request.hash = reader.hash();
+    request.tokenIdentifier = reader.text("str1", kMostTokenIdentifier);
+    if (const auto* pin = reader.optionalText("str2", kMostPin)) request.pin = Secret(*pin);
+    reader.optionalText("str3", kMostOtherText);
+    request.user = reader.user();
+}
+
+void readArguments(Reader& reader, Request& request) {
+    switch (request.operation) {
+        case Operation::Login:
+            return readLogin(reader, request);
+        case Operation::TokenInfo:
+            request.tokenIdentifier = reader.queriedToken();
+            request.user = reader.user();
+            return;
+        case Operation::Pair:
+        case Operation::Unpair:
+            request.hash = reader.hash();
+            request.account = reader.text("str1", kMostAccountName);
+            return;
+        case Operation::Pairings:
+            request.insertedOnly = reader.flag("num1");
+            request.account = reader.text("str1", kMostAccountName);
+            return;
+        case Operation::UnlockKeybag:
+            request.user = reader.user();
+            reader.text("str1", kMostOtherText);
+            return;
+        case Operation::IsPaired:
+            request.account = reader.text("str1", kMostAccountName);
+            return;
+        case Operation::TokenEndpoints:
+            request.user = reader.user();
+            return;
+    }
+}
+
+}  // namespace
+
+Outcome<Request> readRequest(const IncomingRequest& incoming) {
+    Reader reader(incoming);
+    const auto code = reader.number("op");
+    if (code > static_cast<std::uint64_t>(Operation::TokenEndpoints))
+        reader.refuse(platform::text("\"op\" is {}, and operations are 0 to 7", code));
+    if (reader.refusal()) return *reader.refusal();
+
+    Request request;
+    request.operation = static_cast<Operation>(code);
+    readArguments(reader, request);
+    if (reader.refusal()) return *reader.refusal();
+    return request;
+}
+
+std::string describe(const Request& request) {
+    const auto hash = shownHash(request.hash);
+    const auto account = shownText(request.account);
+    switch (request.operation) {
+        case Operation::Login:
+            return platform::text("Logging in with {} of the card {}", hash,
+                                  shownText(request.tokenIdentifier));
+        case Operation::TokenInfo:
+            return "Listing the inserted cards";
+        case Operation::Pair:
+            return platform::text("Pairing {} with {}", account, hash);
+        case Operation::Unpair:
+            return platform::text("Unpairing {} from {}", account, hash);
+        case Operation::Pairings:
+            return platform::text("Listing the pairings of {}", account);
+        case Operation::UnlockKeybag:
+            return "Unlocking a key bag";
+        case Operation::IsPaired:
+            return platform::text("Asking whether {} is paired", account);
+        case Operation::TokenEndpoints:
+            return "Watching for cards";
+    }
+    return {};
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,48 @@
+// Request: what a caller asks, read from a message and checked.
+//
+// Errors:   a key that is missing, of another type, out of its bounds or there twice refuses the
+//           whole request, with a text that names the key. Keys that an operation does not know
+//           are passed over.
+// Threads:  values.
+// In tests: tests/unit/services/request_test.cpp
+
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+#include "platform/types.h"
+#include "services/hints/exchanges.h"
+#include "services/hints/outcome.h"
+#include "services/hints/secret.h"
+
+namespace vlm::service {
+
+enum class Operation : std::uint64_t {
+    Login = 0,
+    TokenInfo = 1,
+    Pair = 2,
+    Unpair = 3,
+    Pairings = 4,
+    UnlockKeybag = 5,
+    IsPaired = 6,
+    TokenEndpoints = 7,
+};
+
+struct Request {
+    Operation operation = Operation::Login;
+    platform::UserId user = platform::kNobody;  // Login, TokenInfo, UnlockKeybag, TokenEndpoints
+    platform::Bytes hash;                       // Login, Pair, Unpair
+    std::string account;                        // Pair, Unpair, Pairings, IsPaired
+    std::string tokenIdentifier;                // Login; TokenInfo: empty for all tokens
+    std::optional<Secret> pin;                  // Login, when the caller has it
+    bool insertedOnly = false;                  // Pairings
+};
+
+Outcome<Request> readRequest(const IncomingRequest& incoming);
+
+// What the request asks for, as the beginning of a sentence that says why it was not done.
+std::string describe(const Request& request);
+
+}  // namespace vlm::service

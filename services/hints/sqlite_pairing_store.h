@@ -1,0 +1,40 @@
+// SqlitePairingStore: the pairings in a database file.
+//
+// Write-ahead log with full synchronisation: a pairing survives a power cut once pair() returned.
+// The statements are prepared once.
+
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include "services/hints/pairing_store.h"
+
+namespace vlm::service {
+
+class SqlitePairingStore final : public PairingStore {
+public:
+    static constexpr const char* kUsualPath = "/var/lib/vlm/hints.sqlite3";
+
+    // Opens the database, or makes it, and brings it to the present schema. Refused: a place that
+    // others may touch (private_file.h), a file that is no database, is another program's or is
+    // damaged, and a schema that is newer than this program. The file is left as it was then.
+    static Outcome<std::unique_ptr<SqlitePairingStore>> open(const std::string& path);
+
+    ~SqlitePairingStore() override;
+
+    std::optional<Refusal> pair(const std::string& account, const platform::Bytes& hash,
+                                std::int64_t now) override;
+    Outcome<bool> unpair(const std::string& account, const platform::Bytes& hash) override;
+    Outcome<std::vector<Pairing>> pairingsOf(const std::string& account) override;
+    Outcome<std::vector<Pairing>> pairingsWith(const platform::Bytes& hash) override;
+    Outcome<bool> isPaired(const std::string& account) override;
+
+private:
+    struct Database;
+    explicit SqlitePairingStore(std::unique_ptr<Database> database);
+
+    std::unique_ptr<Database> _database;
+};
+
+}  // namespace vlm::service

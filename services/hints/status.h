@@ -1,0 +1,30 @@
+// The hints service's own status numbers, as a reply's "res" carries them, each with an error text.
+// 0 is success. The client's own numbers (-1000 to -1003) and the pairing's -8 are left free.
+
+#pragma once
+
+#include "platform/types.h"
+
+namespace vlm::service::status {
+
+using platform::Status;
+
+inline constexpr Status kSuccess = 0;
+inline constexpr Status kBadRequest = -2000;    // a key is missing, of a wrong type or too long
+inline constexpr Status kNotPermitted = -2001;  // the caller may not do this
+inline constexpr Status kNotServed = -2002;     // this instance does not serve this operation
+inline constexpr Status kNoSuchAccount = -2003;
+inline constexpr Status kNoSuchToken = -2004;  // the token is not inserted
+inline constexpr Status kNoSuchKey = -2005;    // the token holds no such identity that can sign
+inline constexpr Status kNoPin = -2006;        // no PIN was given and nobody could be asked
+inline constexpr Status kCancelled = -2007;    // the person dismissed the PIN prompt, or left it
+inline constexpr Status kPinIncorrect = -2008;
+inline constexpr Status kPinLocked = -2009;
+inline constexpr Status kCardFailed = -2010;  // the card, its reader or its module failed
+inline constexpr Status kNotProved = -2011;   // no valid signature by the key was given
+inline constexpr Status kNotPaired = -2012;
+inline constexpr Status kStoreFailed = -2013;  // the pairings could not be read or written
+inline constexpr Status kUnreachable = -2014;  // the daemon does not answer the user's instance
+inline constexpr Status kBusy = -2015;         // too many requests wait for an answer already
+
+}  // namespace vlm::service::status

@@ -1,0 +1,115 @@
+#include "services/hints/tokens/card_module.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "platform/text.h"
+#include "services/hints/tokens/token_prover.h"
+#include "services/hints/tokens/token_reader.h"
+
+namespace vlm::service {
+namespace {
+
+using std::chrono::steady_clock;
+
+// What a slot answers that has no card, or one of another make: nothing to tell anybody about.
+bool meansNoToken(CK_RV result) {
+    return result == CKR_TOKEN_NOT_PRESENT || result == CKR_DEVICE_REMOVED ||
+           result == CKR_SLOT_ID_INVALID || result == CKR_TOKEN_NOT_RECOGNIZED;
+}
+
+// The flags that say what kind of token it is; the others tell of its state and change often.
+CK_FLAGS kindOf(CK_FLAGS flags) {
+    return flags & (CKF_LOGIN_REQUIRED | CKF_PROTECTED_AUTHENTICATION_PATH | CKF_TOKEN_INITIALIZED);
+}
+
+}  // namespace
+
+CardModule::CardModule(std::unique_ptr<Pkcs11Module> module,
+                       std::chrono::milliseconds lookAgainAfter)
+    : _module(std::move(module)), _lookAgainAfter(lookAgainAfter), _looked(steady_clock::now()) {}
+
+std::vector<SlotToken> CardModule::presentTokens() {
+    const bool due = steady_clock::now() - _looked >= _lookAgainAfter;
+    auto tokens = due ? std::vector<SlotToken>{} : _module->tokens();
+    // A software token whose files were taken away fails from then on, until it is looked for anew.
+    const bool failed = std::ranges::any_of(
+        tokens, [](CK_RV result) { return result != CKR_OK && !meansNoToken(result); },
+        &SlotToken::result);
+    if ((due || failed) && _module->isSoftware()) {
+        for (auto& [fields, token] : _known) token.session.reset();
+        _module->reinitialize();
+        _looked = steady_clock::now();
+    } else if (!due) {
+        return tokens;
+    }
+    return _module->tokens();
+}
+
+CardModule::Listing CardModule::list(std::int64_t now) {
+    Listing listing;
+    KnownTokens present;
+    for (const SlotToken& slotToken : presentTokens()) {
+        if (slotToken.result != CKR_OK) {
+            if (!meansNoToken(slotToken.result))
+                listing.problems.push_back(
+                    platform::text("a card in slot {} gives no information: {}", slotToken.slot,
+                                   resultText(slotToken.result)));
+            continue;
+        }
+        if ((slotToken.flags & CKF_TOKEN_INITIALIZED) == 0) continue;
+        Token token = describeToken(slotToken);
+        if (present.contains(slotToken.fields)) {
+            listing.problems.push_back("two cards are the same: " + token.identifier);
+            continue;
+        }
+        const TokenObjects* objects = objectsOf(slotToken, present);
+        if (objects == nullptr) {
+            listing.problems.push_back("the card \"" + token.name + "\" cannot be read");
+            continue;
+        }
+        addIdentities(*objects, now, token);
+        listing.tokens.push_back(std::move(token));
+    }
+    // Tokens that left take their sessions and what was read from them along.
+    _known = std::move(present);
+    std::ranges::sort(listing.tokens, {}, &Token::identifier);
+    return listing;
+}
+
+// What the token holds: as it was read before when it has been there since, else read now. The
+// token moves to, or is put among, those that are present; null when it cannot be read.
+const TokenObjects* CardModule::objectsOf(const SlotToken& token, KnownTokens& present) {
+    auto known = _known.extract(token.fields);
+    if (!known.empty()) {
+        KnownToken& kept = known.mapped();
+        const bool same = kept.slotToken.slot == token.slot &&
+                          kindOf(kept.slotToken.flags) == kindOf(token.flags);
+        if (same && !kept.session) kept.session = _module->openSession(token.slot);
+        if (same && kept.session && kept.session->isValid())
+            return &present.insert(std::move(known)).position->second.objects;
+    }
+    auto session = _module->openSession(token.slot);
+    auto objects = session ? readObjects(*session) : std::nullopt;
+    if (!objects) return nullptr;
+    KnownToken fresh{token, std::move(session), std::move(*objects)};
+    return &present.emplace(token.fields, std::move(fresh)).first->second.objects;
+}
+
+Proof CardModule::prove(ProofRequest request) {
+    for (const SlotToken& slotToken : _module->tokens()) {
+        if (slotToken.result != CKR_OK ||
+            tokenIdentifier(slotToken.fields) != request.tokenIdentifier)
+            continue;
+        const TokenObjects* objects = objectsOf(slotToken, _known);
+        Proof proof;
+        if (objects == nullptr)
+            proof.reason = "the card \"" + describeToken(slotToken).name + "\" cannot be read";
+        else
+            proof = TokenProver(*_module, slotToken, *objects).prove(request);
+        return proof;
+    }
+    return {Proof::Outcome::NoSuchToken, {}, PinState::Ready, "the card is not inserted"};
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,189 @@
+#include "services/hints/tokens/card_worker.h"
+
+#include <sys/socket.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <utility>
+
+#include "platform/system_log.h"
+
+namespace vlm::service {
+namespace {
+
+constexpr platform::Log kLog("org.vlm.token", "hints");
+
+}  // namespace
+
+CardWorker::CardWorker(sd_event* event, WorkerGraveyard& graveyard, std::string name,
+                       WorkerCommand command, WorkerLimits limits)
+    : _event(event),
+      _graveyard(graveyard),
+      _name(std::move(name)),
+      _command(std::move(command)),
+      _limits(limits) {}
+
+CardWorker::~CardWorker() {
+    if (_process) _graveyard.bury(std::move(*_process));
+}
+
+void CardWorker::list(std::function<void(const Tokens&)> answer) {
+    Job job;
+    job.listed = std::move(answer);
+    enqueue(std::move(job));
+}
+
+void CardWorker::prove(ProofRequest request, std::function<void(Proof)> answer) {
+    Job job;
+    job.proof = std::move(request);
+    job.proved = std::move(answer);
+    enqueue(std::move(job));
+}
+
+std::chrono::milliseconds CardWorker::limitOf(const Job& job) const {
+    return job.proof ? _limits.prove : _limits.list;
+}
+
+void CardWorker::enqueue(Job job) {
+    const auto place = _waiting.insert(_waiting.end(), std::move(job));
+    place->limit = callAfter(_event, limitOf(*place), [this, place] { waitedTooLong(place); });
+    scheduleStart();
+}
+
+// From the loop, so that nobody is answered before the asking call has returned.
+void CardWorker::scheduleStart() {
+    if (!_current && !_waiting.empty()) _start = callSoon(_event, [this] { startNext(); });
+}
+
+void CardWorker::startNext() {
+    if (_current || _waiting.empty()) return;
+    _idle.reset();
+    _current = std::move(_waiting.front());
+    _waiting.pop_front();
+    // Time spent in the queue is not held against the worker.
+    _current->limit = callAfter(_event, limitOf(*_current),
+                                [this] { fail("did not answer in time and was ended"); });
+    if (!ensureProcess()) return fail("has no process to run in");
+    if (!send(*_current)) fail("does not take requests");
+}
+
+bool CardWorker::send(Job& job) {
+    if (!job.proof) {
+        const auto message = encodeListRequest();
+        return message && sendFrames(_process->socket.get(), *message, nullptr);
+    }
+    const auto message = encodeProofRequest(*job.proof);
+    const bool sent = message && sendFrames(_process->socket.get(), *message, &job.proof->pin);
+    job.proof->pin = Secret();
+    return sent;
+}
+
+bool CardWorker::ensureProcess() {
+    if (_process) return true;
+    _process = startWorker(_command);
+    if (!_process) return false;
+    _incoming = {};
+    _hasListed = false;
+    _readable = callWhenReadable(_event, _process->socket.get(), [this] { receive(); });
+    return _readable != nullptr;
+}
+
+void CardWorker::receive() {
+    std::array<std::uint8_t, 64UL * 1024> piece;
+    const ssize_t size = recv(_process->socket.get(), piece.data(), piece.size(), MSG_DONTWAIT);
+    if (size < 0 && (errno == EAGAIN || errno == EINTR)) return;
+    if (size <= 0) return fail("crashed or ended");
+    if (!_current) return fail("spoke without being asked");
+    switch (_incoming.add(std::span(piece).first(static_cast<std::size_t>(size)))) {
+        case FrameAssembler::State::Incomplete:
+            return;
+        case FrameAssembler::State::TooLong:
+            return fail("gave an answer that is too long");
+        case FrameAssembler::State::Complete:
+            return receiveAnswer(_incoming.take());
+    }
+}
+
+void CardWorker::receiveAnswer(const Bytes& message) {
+    auto answer = decodeAnswer(message);
+    if (!answer) return fail("gave an answer that makes no sense");
+    if (const auto* failed = std::get_if<FailedAnswer>(&*answer))
+        return fail("is of no use: " + failed->reason);
+    auto* listed = std::get_if<ListAnswer>(&*answer);
+    if ((listed != nullptr) == _current->proof.has_value())
+        return fail("gave an answer to another question");
+    if (listed != nullptr)
+        finishList(std::move(*listed));
+    else
+        finishProof(std::move(std::get<Proof>(*answer)));
+}
+
+void CardWorker::finishList(ListAnswer answer) {
+    // A listing may say "as before", but not before there was one.
+    if (!answer.tokens && !_hasListed) return fail("gave an answer that makes no sense");
+    if (answer.tokens) _tokens = std::move(*answer.tokens);
+    _hasListed = true;
+    std::string problems;
+    for (const std::string& problem : answer.problems)
+        problems += (problems.empty() ? "" : "; ") + problem;
+    if (problems.empty())
+        _reported.reset();
+    else
+        report("the card module " + _name + ": " + problems);
+
+    const auto listed = std::move(_current->listed);
+    goIdle();
+    listed(_tokens);
+}
+
+void CardWorker::finishProof(Proof proof) {
+    const auto proved = std::move(_current->proved);
+    goIdle();
+    proved(std::move(proof));
+}
+
+void CardWorker::goIdle() {
+    _current.reset();
+    scheduleStart();
+    _idle = callAfter(_event, _limits.idle, [this] {
+        _readable.reset();
+        if (_process) _graveyard.letLeave(std::move(*_process));
+        _process.reset();
+    });
+}
+
+void CardWorker::waitedTooLong(std::list<Job>::iterator job) {
+    const Job late = std::move(*job);
+    _waiting.erase(job);
+    if (!late.proof) return late.listed(_tokens);
+    late.proved(
+        {Proof::Outcome::CardFailed, {}, PinState::Ready, "the card is busy with another login"});
+}
+
+// Ends the worker, and with it what it was asked for, if anything.
+void CardWorker::fail(const std::string& why) {
+    _readable.reset();
+    _idle.reset();
+    if (_process) _graveyard.bury(std::move(*_process));
+    _process.reset();
+    _tokens.clear();
+    report("the card module " + _name + " " + why);
+    if (!_current) return;
+    const Job job = std::move(*_current);
+    _current.reset();
+    scheduleStart();
+    if (!job.proof) return job.listed({});
+    job.proved({Proof::Outcome::CardFailed,
+                {},
+                PinState::Ready,
+                "the module of the card (" + _name + ") " + why});
+}
+
+// The same trouble again and again is said once.
+void CardWorker::report(const std::string& line) {
+    if (_reported != line) kLog.error("{}", line);
+    _reported = line;
+}
+
+}  // namespace vlm::service

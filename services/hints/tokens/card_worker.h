@@ -1,0 +1,98 @@
+// CardWorker: one card module, in a worker process of its own that is started when it is needed.
+//
+// The worker serves one request at a time; others wait. A worker that ends, breaks its word or
+// takes longer than a request's limit is ended, fails that request, and is started anew for the
+// next one. Without a request for a while it is ended as well, so that its memory comes back.
+//
+// A listing that waits behind a proof (which may wait for a person at a PIN pad) for longer than
+// its own limit is answered with the tokens that the module had last.
+//
+// Threads: the event loop's. Answers come from the loop, exactly once each, never before the
+// asking call has returned; at the end of the worker's life those that are missing do not come.
+
+#pragma once
+
+#include <chrono>
+#include <functional>
+#include <list>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "services/hints/tokens.h"
+#include "services/hints/tokens/event_source.h"
+#include "services/hints/tokens/frames.h"
+#include "services/hints/tokens/worker_process.h"
+#include "services/hints/tokens/worker_protocol.h"
+
+namespace vlm::service {
+
+struct WorkerLimits {
+    std::chrono::milliseconds list{5'000};
+    std::chrono::milliseconds prove{60'000};
+    std::chrono::milliseconds idle{60'000};
+};
+
+class CardWorker {
+public:
+    using Tokens = std::vector<Token>;
+
+    // The name is the module's, for the log. Loop and graveyard must outlive the worker.
+    CardWorker(sd_event* event, WorkerGraveyard& graveyard, std::string name, WorkerCommand command,
+               WorkerLimits limits);
+    ~CardWorker();
+    CardWorker(const CardWorker&) = delete;
+    CardWorker& operator=(const CardWorker&) = delete;
+
+    // No tokens when the module fails; why is in the log then.
+    void list(std::function<void(const Tokens&)> answer);
+    void prove(ProofRequest request, std::function<void(Proof)> answer);
+
+    // As of the last listing.
+    const Tokens& lastTokens() const { return _tokens; }
+
+private:
+    struct Job {
+        std::optional<ProofRequest> proof;  // none: a listing
+        std::function<void(const Tokens&)> listed;
+        std::function<void(Proof)> proved;
+        EventSource limit;
+    };
+
+    std::chrono::milliseconds limitOf(const Job& job) const;
+    void enqueue(Job job);
+    void startNext();
+    bool send(Job& job);
+    bool ensureProcess();
+    void receive();
+    void receiveAnswer(const Bytes& message);
+    void finishList(ListAnswer answer);
+    void finishProof(Proof proof);
+    void waitedTooLong(std::list<Job>::iterator job);
+    void fail(const std::string& why);
+    void report(const std::string& line);
+    void scheduleStart();
+    void goIdle();
+
+    sd_event* _event;
+    WorkerGraveyard& _graveyard;
+    std::string _name;
+    WorkerCommand _command;
+    WorkerLimits _limits;
+
+    std::list<Job> _waiting;
+    std::optional<Job> _current;
+    EventSource _start;
+    EventSource _idle;
+
+    std::optional<WorkerProcess> _process;
+    EventSource _readable;
+    FrameAssembler _incoming;
+    bool _hasListed = false;  // this process has told its tokens
+
+    Tokens _tokens;
+    std::optional<std::string> _reported;  // the last line that was logged, while it stays true
+};
+
+}  // namespace vlm::service

@@ -1,0 +1,118 @@
+#include "services/hints/tokens/identities.h"
+
+#include <algorithm>
+#include <map>
+#include <span>
+#include <tuple>
+
+namespace vlm::service {
+namespace {
+
+using Octets = std::span<const std::uint8_t>;
+
+// An elliptic-curve point by its first coordinate, compressed or not; `point` may stand in a DER
+// octet string, as it should, or bare, as some modules have it.
+SameKey samePoint(Octets point, Octets coordinate) {
+    const auto isPoint = [&coordinate](Octets octets) {
+        const std::size_t size = coordinate.size();
+        return (octets.size() == 1 + 2 * size && octets[0] == 4) ||
+               (octets.size() == 1 + size && (octets[0] == 2 || octets[0] == 3));
+    };
+    const auto compare = [&coordinate](Octets octets) {
+        const bool same = std::ranges::equal(octets.subspan(1, coordinate.size()), coordinate);
+        return same ? SameKey::Yes : SameKey::No;
+    };
+    if (isPoint(point)) return compare(point);
+    for (const std::size_t header : {2U, 3U})  // one and two length bytes
+        if (point.size() > header && point[0] == 4 && isPoint(point.subspan(header)))
+            return compare(point.subspan(header));
+    return SameKey::No;
+}
+
+struct KeyAbilities {
+    bool signs = false;
+    bool wraps = false;
+};
+
+// What the key behind the certificate can do; none when there is no such key on the token.
+std::optional<KeyAbilities> keyBehind(const CertificateObject& certificate,
+                                      const TokenObjects& objects, bool needsLogin) {
+    if (!objects.showsKeys && needsLogin) return KeyAbilities{true, true};
+
+    std::optional<KeyAbilities> byPrivate;
+    std::optional<KeyAbilities> byPublic;
+    for (const KeyObject& key : objects.keys) {
+        const SameKey same = sameKey(key, certificate.facts);
+        if (key.id != certificate.id || same == SameKey::No) continue;
+        if (key.id.empty() && same == SameKey::Untold) continue;
+        std::optional<KeyAbilities>& abilities = key.isPrivate ? byPrivate : byPublic;
+        if (!abilities) abilities.emplace();
+        abilities->signs |= key.signs;
+        abilities->wraps |= key.wraps;
+    }
+    // Without a login to hide it, a private key that is not seen is not there.
+    return byPrivate || !needsLogin ? byPrivate : byPublic;
+}
+
+// Puts the certificate that stands for a key in front of another one on the same key.
+// The last ranks only make the choice independent of the order in which the module lists them.
+bool standsBefore(const CertificateObject& one, const CertificateObject& other, std::int64_t now) {
+    const auto rank = [now](const CertificateObject& certificate) {
+        const CertificateFacts& facts = certificate.facts;
+        return std::tuple(facts.validAt(now), facts.notBefore, facts.notAfter, facts.maySign,
+                          facts.mayWrap, std::string_view(facts.name),
+                          std::string_view(certificate.label));
+    };
+    return rank(one) > rank(other);
+}
+
+struct Candidate {
+    const CertificateObject* certificate;
+    KeyAbilities key;
+};
+
+}  // namespace
+
+SameKey sameKey(const KeyObject& key, const CertificateFacts& certificate) {
+    if (key.kind != certificate.keyKind) return SameKey::No;
+    if (key.publicPart.empty()) return SameKey::Untold;
+    Octets part = key.publicPart;
+    if (key.kind == KeyKind::Ec) return samePoint(part, certificate.publicNumber);
+    while (!part.empty() && part.front() == 0) part = part.subspan(1);
+    return std::ranges::equal(part, certificate.publicNumber) ? SameKey::Yes : SameKey::No;
+}
+
+void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token) {
+    std::map<Bytes, Candidate> byHash;
+    for (const CertificateObject& certificate : objects.certificates) {
+        const auto key = keyBehind(certificate, objects, token.needsLogin);
+        if (!key) continue;
+        const auto [place, isNew] =
+            byHash.try_emplace(certificate.facts.publicKeyHash, Candidate{&certificate, *key});
+        if (!isNew && standsBefore(certificate, *place->second.certificate, now))
+            place->second = {&certificate, *key};
+    }
+
+    std::optional<KeyKind> wrapKind;
+    for (const auto& [hash, candidate] : byHash) {
+        const CertificateFacts& facts = candidate.certificate->facts;
+        Identity identity;
+        identity.publicKeyHash = hash;
+        identity.publicKeyInfo = facts.publicKeyInfo;
+        identity.name = facts.name.empty() ? candidate.certificate->label : facts.name;
+        identity.notBefore = facts.notBefore;
+        identity.notAfter = facts.notAfter;
+        identity.canSign = facts.maySign && candidate.key.signs;
+        token.identities.push_back(std::move(identity));
+
+        // RSA goes before EC, and among keys of a kind the smallest hash, which comes first here.
+        const bool better =
+            !wrapKind || (*wrapKind == KeyKind::Ec && facts.keyKind == KeyKind::Rsa);
+        if (facts.mayWrap && candidate.key.wraps && better) {
+            wrapKind = facts.keyKind;
+            token.wrapKeyHash = hash;
+        }
+    }
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,32 @@
+// Which card modules this machine has: the .module files that pkcs11.conf(5) describes, read
+// without loading any module. p11-kit itself would load them all into the asking process.
+
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace vlm::service {
+
+struct ModuleFolders {
+    // Where this machine's p11-kit looks, as it was when this was built.
+    static ModuleFolders ofThisMachine();
+
+    std::string packageFiles;  // what packages install
+    std::string adminFiles;    // goes before a package's file of the same name, setting by setting
+    std::string modules;       // a module that is named without a folder lies here
+};
+
+struct ConfiguredModule {
+    std::string name;  // of its .module file, without the ending
+    std::string path;  // of the module itself, links followed
+
+    bool operator==(const ConfiguredModule&) const = default;
+};
+
+// The modules to load, most important first, each once. Modules that run elsewhere, that only hold
+// trust anchors or that are not meant for this program are left out. A file that is not well
+// formed, or whose module is not there, is one line in the log; the others count all the same.
+std::vector<ConfiguredModule> configuredModules(const ModuleFolders& folders);
+
+}  // namespace vlm::service

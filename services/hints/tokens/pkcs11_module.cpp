@@ -1,0 +1,104 @@
+#include "services/hints/tokens/pkcs11_module.h"
+
+#include <p11-kit/p11-kit.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <utility>
+
+#include "platform/text.h"
+#include "services/hints/tokens/card_text.h"
+
+namespace vlm::service {
+namespace {
+
+template <std::size_t size>
+std::string field(const CK_UTF8CHAR (&padded)[size]) {
+    return {reinterpret_cast<const char*>(padded), size};
+}
+
+}  // namespace
+
+std::string resultText(CK_RV result) {
+    char number[24];
+    std::snprintf(number, sizeof number, "0x%lx", result);
+    return platform::text("{} ({})", harmlessText(p11_kit_strerror(result)), number);
+}
+
+std::unique_ptr<Pkcs11Module> Pkcs11Module::load(const std::string& path, std::string* reason) {
+    CK_FUNCTION_LIST* module = p11_kit_module_load(path.c_str(), P11_KIT_MODULE_CRITICAL);
+    if (module == nullptr) {
+        const char* message = p11_kit_message();
+        *reason = "it cannot be loaded: " + harmlessText(message == nullptr ? path : message);
+        return nullptr;
+    }
+    const CK_RV result = p11_kit_module_initialize(module);
+    if (result != CKR_OK) {
+        p11_kit_module_release(module);
+        *reason = "it cannot be initialised: " + resultText(result);
+        return nullptr;
+    }
+    return std::unique_ptr<Pkcs11Module>(new Pkcs11Module(module));
+}
+
+Pkcs11Module::~Pkcs11Module() {
+    p11_kit_module_finalize(_module);
+    p11_kit_module_release(_module);
+}
+
+CK_RV Pkcs11Module::reinitialize() {
+    p11_kit_module_finalize(_module);
+    return p11_kit_module_initialize(_module);
+}
+
+std::vector<CK_SLOT_ID> Pkcs11Module::slots(bool withToken) const {
+    // Asking for the number first makes a module look again at what is there.
+    CK_ULONG count = 0;
+    if (_module->C_GetSlotList(withToken, nullptr, &count) != CKR_OK) return {};
+    // Some room more, for a card that comes in between.
+    std::vector<CK_SLOT_ID> slots(std::min<std::size_t>(count, kMostSlots) + 8);
+    count = slots.size();
+    if (_module->C_GetSlotList(withToken, slots.data(), &count) != CKR_OK) return {};
+    slots.resize(std::min<std::size_t>(count, slots.size()));
+    return slots;
+}
+
+std::vector<SlotToken> Pkcs11Module::tokens() const {
+    std::vector<SlotToken> tokens;
+    for (const CK_SLOT_ID slot : slots(true)) tokens.push_back(tokenIn(slot));
+    return tokens;
+}
+
+SlotToken Pkcs11Module::tokenIn(CK_SLOT_ID slot) const {
+    SlotToken token;
+    CK_TOKEN_INFO info = {};
+    token.slot = slot;
+    token.result = _module->C_GetTokenInfo(slot, &info);
+    if (token.result != CKR_OK) return token;
+    token.flags = info.flags;
+    token.fields = {field(info.model), field(info.manufacturerID), field(info.serialNumber),
+                    field(info.label)};
+    return token;
+}
+
+bool Pkcs11Module::isSoftware() const {
+    return std::ranges::none_of(slots(false), [this](CK_SLOT_ID slot) {
+        CK_SLOT_INFO info = {};
+        return _module->C_GetSlotInfo(slot, &info) == CKR_OK && (info.flags & CKF_HW_SLOT) != 0;
+    });
+}
+
+std::optional<Pkcs11Session> Pkcs11Module::openSession(CK_SLOT_ID slot) const {
+    CK_SESSION_HANDLE session = 0;
+    if (_module->C_OpenSession(slot, CKF_SERIAL_SESSION, nullptr, nullptr, &session) != CKR_OK)
+        return {};
+    return Pkcs11Session(_module, session);
+}
+
+bool Pkcs11Module::offers(CK_SLOT_ID slot, CK_MECHANISM_TYPE mechanism) const {
+    CK_MECHANISM_INFO info = {};
+    return _module->C_GetMechanismInfo(slot, mechanism, &info) == CKR_OK &&
+           (info.flags & CKF_SIGN) != 0;
+}
+
+}  // namespace vlm::service

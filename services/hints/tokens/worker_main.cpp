@@ -1,0 +1,111 @@
+// vlm-token-worker: answers for the tokens of one card module. The hints service starts it with a
+// socket as descriptor 3; it serves that until the other side closes it.
+//
+//   vlm-token-worker LOOK-AGAIN-MILLISECONDS MODULE-PATH
+
+#include <sys/prctl.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <charconv>
+#include <cstdio>
+#include <ctime>
+#include <string>
+
+#include "services/hints/tokens/card_module.h"
+#include "services/hints/tokens/frames.h"
+#include "services/hints/tokens/worker_protocol.h"
+
+namespace vlm::service {
+namespace {
+
+constexpr int kSocket = 3;
+constexpr unsigned kSecondsToLeave = 5;
+
+// A PIN passes through this process: nothing of its memory may be kept or looked at.
+void closeToOthers() {
+    const rlimit none = {0, 0};
+    setrlimit(RLIMIT_CORE, &none);
+    prctl(PR_SET_DUMPABLE, 0);
+}
+
+class Worker {
+public:
+    Worker(std::string modulePath, std::chrono::milliseconds lookAgainAfter)
+        : _modulePath(std::move(modulePath)), _lookAgainAfter(lookAgainAfter) {}
+
+    void serve() {
+        while (const auto message = readFrame(kSocket)) {
+            auto request = decodeRequest(*message);
+            if (!request) return;
+            std::optional<Bytes> answer;
+            if (auto* proof = std::get_if<ProofRequest>(&*request)) {
+                auto pin = readSecretFrame(kSocket, kMostPinBytes);
+                if (!pin) return;
+                proof->pin = std::move(*pin);
+                answer = prove(std::move(*proof));
+            } else {
+                answer = list();
+            }
+            if (!answer || !writeFrame(kSocket, *answer)) return;
+        }
+    }
+
+private:
+    // Why the module is of no use; none when it is loaded.
+    std::optional<FailedAnswer> load() {
+        if (_module) return {};
+        FailedAnswer failed;
+        auto module = Pkcs11Module::load(_modulePath, &failed.reason);
+        if (!module) return failed;
+        _module.emplace(std::move(module), _lookAgainAfter);
+        return {};
+    }
+
+    std::optional<Bytes> list() {
+        if (const auto failed = load()) return encodeAnswer(*failed);
+        auto [tokens, problems] = _module->list(std::time(nullptr));
+        ListAnswer answer{std::nullopt, std::move(problems)};
+        if (_told != tokens) answer.tokens = _told = std::move(tokens);
+        return encodeAnswer(answer);
+    }
+
+    std::optional<Bytes> prove(ProofRequest request) {
+        if (const auto failed = load()) return encodeAnswer(*failed);
+        return encodeAnswer(_module->prove(std::move(request)));
+    }
+
+    std::string _modulePath;
+    std::chrono::milliseconds _lookAgainAfter;
+    std::optional<CardModule> _module;
+    std::optional<std::vector<Token>> _told;  // what the other side knows
+};
+
+int run(int argc, char* argv[]) {
+    int milliseconds = 0;
+    const std::string_view number = argc == 3 ? argv[1] : "";
+    const char* end = number.data() + number.size();
+    struct stat status = {};
+    if (number.empty() || std::from_chars(number.data(), end, milliseconds).ptr != end ||
+        fstat(kSocket, &status) != 0 || !S_ISSOCK(status.st_mode)) {
+        std::fputs("vlm-token-worker: it is started by the hints service, not by hand\n", stderr);
+        return 2;
+    }
+    closeToOthers();
+    Worker worker(argv[2], std::chrono::milliseconds(milliseconds));
+    worker.serve();
+    // Nobody waits any more; a module that does not come to an end is cut short.
+    alarm(kSecondsToLeave);
+    return 0;
+}
+
+}  // namespace
+}  // namespace vlm::service
+
+int main(int argc, char* argv[]) {
+    const int status = vlm::service::run(argc, argv);
+    // The module's own clean-up at exit is not waited for: some crash in it.
+    std::fflush(nullptr);
+    _exit(status);
+}

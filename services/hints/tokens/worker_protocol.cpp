@@ -1,0 +1,261 @@
+#include "services/hints/tokens/worker_protocol.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "platform/property_list.h"
+#include "services/hints/tokens/card_text.h"
+#include "services/hints/tokens/frames.h"
+#include "services/hints/tokens/signature.h"
+
+namespace vlm::service {
+namespace {
+
+using platform::PropertyList;
+using platform::PropertyListLimits;
+using Array = PropertyList::Array;
+using Dictionary = PropertyList::Dictionary;
+
+constexpr PropertyListLimits kLimits = {
+    .depth = 8, .objects = std::size_t{1} << 19U, .bytes = kMostFrameBytes};
+constexpr std::size_t kMostTokens = 1024;
+constexpr std::size_t kMostIdentities = 4096;  // on one token
+constexpr std::size_t kMostIdentifierBytes = 2048;
+constexpr std::size_t kMostKeyBytes = 8192;
+constexpr std::size_t kMostSignatureBytes = 4096;
+constexpr std::size_t kMostProblems = 64;
+constexpr std::size_t kMostReasonCharacters = 512;
+constexpr std::size_t kHashBytes = 32;
+
+// Reads entries of one dictionary; after an entry that is missing, of a wrong type or out of
+// bounds it has failed, and says so at the end, so that each entry needs no check of its own.
+class Entries {
+public:
+    explicit Entries(const PropertyList* value)
+        : _entries(value == nullptr ? nullptr : value->dictionary()),
+          _failed(_entries == nullptr) {}
+
+    bool failed() const { return _failed; }
+    bool has(std::string_view key) const { return _entries != nullptr && _entries->contains(key); }
+
+    std::string text(std::string_view key, std::size_t most) {
+        const PropertyList* value = find(key);
+        const std::string* text = value == nullptr ? nullptr : value->text();
+        if (text == nullptr || text->size() > most) return fail<std::string>();
+        return *text;
+    }
+    std::string shownText(std::string_view key, std::size_t characters) {
+        return harmlessText(text(key, characters * 4), characters);
+    }
+    Bytes bytes(std::string_view key, std::size_t least, std::size_t most) {
+        const PropertyList* value = find(key);
+        const Bytes* bytes = value == nullptr ? nullptr : value->bytes();
+        if (bytes == nullptr || bytes->size() < least || bytes->size() > most) return fail<Bytes>();
+        return *bytes;
+    }
+    bool boolean(std::string_view key) {
+        const PropertyList* value = find(key);
+        const auto boolean = value == nullptr ? std::nullopt : value->boolean();
+        return boolean ? *boolean : fail<bool>();
+    }
+    std::int64_t integer(std::string_view key) {
+        const PropertyList* value = find(key);
+        const auto integer = value == nullptr ? std::nullopt : value->integer();
+        return integer ? *integer : fail<std::int64_t>();
+    }
+    // One of an enumeration's values, which go from 0 to `last` without a gap.
+    template <typename Enumeration>
+    Enumeration oneOf(std::string_view key, Enumeration last) {
+        const std::int64_t number = integer(key);
+        if (number < 0 || number > static_cast<std::int64_t>(last)) return fail<Enumeration>();
+        return static_cast<Enumeration>(number);
+    }
+    const Array& array(std::string_view key, std::size_t most) {
+        static const Array kNone;
+        const PropertyList* value = find(key);
+        const Array* array = value == nullptr ? nullptr : value->array();
+        if (array != nullptr && array->size() <= most) return *array;
+        _failed = true;
+        return kNone;
+    }
+
+private:
+    const PropertyList* find(std::string_view key) const {
+        return _entries == nullptr ? nullptr : _entries->find(key);
+    }
+    template <typename Value>
+    Value fail() {
+        _failed = true;
+        return Value{};
+    }
+
+    const Dictionary* _entries;
+    bool _failed;
+};
+
+std::optional<Bytes> write(Dictionary message) {
+    return platform::writeBinaryPropertyList(std::move(message), kLimits);
+}
+
+PropertyList encode(const Identity& identity) {
+    return Dictionary{{"key", identity.publicKeyInfo},
+                      {"name", identity.name},
+                      {"from", identity.notBefore},
+                      {"until", identity.notAfter},
+                      {"signs", identity.canSign}};
+}
+
+std::optional<Identity> decodeIdentity(const PropertyList& value) {
+    Entries entries(&value);
+    Identity identity;
+    identity.publicKeyInfo = entries.bytes("key", 1, kMostKeyBytes);
+    // The hash is made here, so that it is right whatever the worker is up to.
+    identity.publicKeyHash = sha256(identity.publicKeyInfo);
+    identity.name = entries.shownText("name", kCardTextLength);
+    identity.notBefore = entries.integer("from");
+    identity.notAfter = entries.integer("until");
+    identity.canSign = entries.boolean("signs");
+    if (entries.failed()) return {};
+    return identity;
+}
+
+PropertyList encode(const Token& token) {
+    Array identities;
+    for (const Identity& identity : token.identities) identities.push_back(encode(identity));
+    Dictionary dictionary{{"id", token.identifier},
+                          {"name", token.name},
+                          {"pad", token.hasPinPad},
+                          {"login", token.needsLogin},
+                          {"pin", static_cast<std::int64_t>(token.pinState)},
+                          {"identities", std::move(identities)}};
+    if (token.wrapKeyHash) dictionary.set("wrap", *token.wrapKeyHash);
+    return dictionary;
+}
+
+// Whether the text can stand in a URI: the identifier is shown and logged as it is.
+bool isIdentifier(const std::string& text) {
+    return text.starts_with("pkcs11:") &&
+           std::ranges::all_of(text, [](char c) { return c > ' ' && c < 0x7F; });
+}
+
+std::optional<Token> decodeToken(const PropertyList& value) {
+    Entries entries(&value);
+    Token token;
+    token.identifier = entries.text("id", kMostIdentifierBytes);
+    token.name = entries.shownText("name", kCardTextLength);
+    token.hasPinPad = entries.boolean("pad");
+    token.needsLogin = entries.boolean("login");
+    token.pinState = entries.oneOf("pin", PinState::Locked);
+    if (entries.has("wrap")) token.wrapKeyHash = entries.bytes("wrap", kHashBytes, kHashBytes);
+    for (const PropertyList& each : entries.array("identities", kMostIdentities)) {
+        auto identity = decodeIdentity(each);
+        if (!identity) return {};
+        token.identities.push_back(std::move(*identity));
+    }
+    if (entries.failed() || !isIdentifier(token.identifier)) return {};
+    std::ranges::sort(token.identities, {}, &Identity::publicKeyHash);
+    const auto twice = std::ranges::unique(token.identities, {}, &Identity::publicKeyHash);
+    token.identities.erase(twice.begin(), twice.end());
+    return token;
+}
+
+std::optional<ListAnswer> decodeListAnswer(Entries entries) {
+    ListAnswer answer;
+    for (const PropertyList& each : entries.array("problems", kMostProblems)) {
+        if (each.text() == nullptr) return {};
+        answer.problems.push_back(harmlessText(*each.text(), kMostReasonCharacters));
+    }
+    if (entries.has("tokens")) {
+        answer.tokens.emplace();
+        for (const PropertyList& each : entries.array("tokens", kMostTokens)) {
+            auto token = decodeToken(each);
+            if (!token) return {};
+            answer.tokens->push_back(std::move(*token));
+        }
+    }
+    if (entries.failed()) return {};
+    return answer;
+}
+
+std::optional<Proof> decodeProof(Entries entries) {
+    Proof proof;
+    proof.outcome = entries.oneOf("outcome", Proof::Outcome::CardFailed);
+    proof.signature = entries.bytes("signature", 0, kMostSignatureBytes);
+    proof.pinStateAfter = entries.oneOf("pin", PinState::Locked);
+    proof.reason = entries.shownText("reason", kMostReasonCharacters);
+    if (entries.failed()) return {};
+    return proof;
+}
+
+}  // namespace
+
+std::optional<Bytes> encodeListRequest() { return write({{"op", "list"}}); }
+
+std::optional<Bytes> encodeProofRequest(const ProofRequest& request) {
+    if (request.tokenIdentifier.size() > kMostIdentifierBytes ||
+        request.challenge.size() > kMostChallengeBytes ||
+        request.publicKeyHash.size() != kHashBytes || request.pin.text().size() > kMostPinBytes)
+        return {};
+    return write({{"op", "prove"},
+                  {"token", request.tokenIdentifier},
+                  {"hash", request.publicKeyHash},
+                  {"challenge", request.challenge}});
+}
+
+std::optional<std::variant<ListRequest, ProofRequest>> decodeRequest(
+    std::span<const std::uint8_t> message) {
+    const auto value = platform::readPropertyList(message, kLimits);
+    Entries entries(value ? &*value : nullptr);
+    const std::string operation = entries.text("op", 16);
+    if (operation == "list") return ListRequest{};
+    if (operation != "prove") return {};
+    ProofRequest request;
+    request.tokenIdentifier = entries.text("token", kMostIdentifierBytes);
+    request.publicKeyHash = entries.bytes("hash", kHashBytes, kHashBytes);
+    request.challenge = entries.bytes("challenge", 0, kMostChallengeBytes);
+    if (entries.failed()) return {};
+    return request;
+}
+
+std::optional<Bytes> encodeAnswer(const ListAnswer& answer) {
+    Array problems;
+    for (const std::string& problem : answer.problems)
+        if (problems.size() < kMostProblems) problems.emplace_back(problem);
+    Dictionary message{{"problems", std::move(problems)}};
+    if (answer.tokens) {
+        Array tokens;
+        for (const Token& token : *answer.tokens) tokens.push_back(encode(token));
+        message.set("tokens", std::move(tokens));
+    }
+    return write(std::move(message));
+}
+
+std::optional<Bytes> encodeAnswer(const Proof& answer) {
+    return write({{"outcome", static_cast<std::int64_t>(answer.outcome)},
+                  {"signature", answer.signature},
+                  {"pin", static_cast<std::int64_t>(answer.pinStateAfter)},
+                  {"reason", answer.reason}});
+}
+
+std::optional<Bytes> encodeAnswer(const FailedAnswer& answer) {
+    return write({{"failed", answer.reason}});
+}
+
+std::optional<std::variant<ListAnswer, Proof, FailedAnswer>> decodeAnswer(
+    std::span<const std::uint8_t> message) {
+    const auto value = platform::readPropertyList(message, kLimits);
+    Entries entries(value ? &*value : nullptr);
+    if (entries.has("failed")) {
+        FailedAnswer answer{entries.shownText("failed", kMostReasonCharacters)};
+        if (entries.failed()) return {};
+        return answer;
+    }
+    if (entries.has("outcome")) {
+        if (auto proof = decodeProof(entries)) return std::move(*proof);
+        return {};
+    }
+    if (auto answer = decodeListAnswer(entries)) return std::move(*answer);
+    return {};
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,47 @@
+// What the service and a card worker say to each other. A message is a binary property list in a
+// frame; a request to prove is followed by one more frame that holds nothing but the PIN, so that
+// the PIN never lies in an ordinary buffer.
+//
+// Neither side believes the other: a card module may have corrupted the worker. Reading answers
+// none for anything that is not such a message within the bounds.
+
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+#include <variant>
+#include <vector>
+
+#include "services/hints/tokens.h"
+
+namespace vlm::service {
+
+inline constexpr std::size_t kMostPinBytes = 256;
+inline constexpr std::size_t kMostChallengeBytes = 4096;
+
+struct ListRequest {};
+
+// The request, without the PIN that follows it; none for one that is out of bounds.
+std::optional<Bytes> encodeListRequest();
+std::optional<Bytes> encodeProofRequest(const ProofRequest& request);
+std::optional<std::variant<ListRequest, ProofRequest>> decodeRequest(
+    std::span<const std::uint8_t> message);
+
+// Tokens are absent when they are as this worker told them last.
+struct ListAnswer {
+    std::optional<std::vector<Token>> tokens;
+    std::vector<std::string> problems;  // for the log
+};
+struct FailedAnswer {
+    std::string reason;  // why the module is of no use
+};
+
+std::optional<Bytes> encodeAnswer(const ListAnswer& answer);
+std::optional<Bytes> encodeAnswer(const Proof& answer);
+std::optional<Bytes> encodeAnswer(const FailedAnswer& answer);
+std::optional<std::variant<ListAnswer, Proof, FailedAnswer>> decodeAnswer(
+    std::span<const std::uint8_t> message);
+
+}  // namespace vlm::service

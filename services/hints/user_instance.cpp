@@ -1,0 +1,67 @@
+#include "services/hints/bus_caller_watch.h"
+#include "services/hints/bus_connection.h"
+#include "services/hints/bus_daemon_link.h"
+#include "services/hints/bus_server.h"
+#include "services/hints/desktop_pin_prompt.h"
+#include "services/hints/forwarding_service.h"
+#include "services/hints/hints_log.h"
+#include "services/hints/instances.h"
+#include "services/hints/pin_asking.h"
+#include "services/hints/prompter_registration.h"
+#include "services/hints/service_names.h"
+
+namespace vlm::service {
+
+namespace {
+
+// What this instance does for the daemon, on the system bus.
+class DesktopPrompter {
+public:
+    DesktopPrompter(sd_event* event, sd_bus* systemBus, const std::string& pinentry)
+        : _prompt(event, pinentry),
+          _callers(systemBus),
+          _asking(_prompt, _callers),
+          _server(systemBus, kPrompterInterface, "AskPin", _asking),
+          _registration(systemBus) {}
+
+    bool start() { return _server.start() && _registration.start(); }
+
+private:
+    DesktopPinPrompt _prompt;
+    BusCallerWatch _callers;
+    PinAsking _asking;
+    BusServer _server;
+    PrompterRegistration _registration;
+};
+
+}  // namespace
+
+InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
+    const auto bus = BusConnection::open(loop.get(), BusKind::Session,
+                                         [&](const std::string& reason) { loop.fail(reason); });
+    if (!bus) return {bus.refusal().text};
+    sd_bus* const connection = (*bus)->get();
+
+    BusCallerWatch callers(connection);
+    BusDaemonLink daemon(loop.get());
+    ForwardingService service(daemon, callers);
+    BusServer server(connection, kHintsInterface, "Exchange", service);
+    if (!server.start()) return {"the bus does not take the service"};
+
+    // Without a system bus there is no daemon that could ask; requests say so themselves.
+    const auto systemBus =
+        BusConnection::open(loop.get(), BusKind::System, [](const std::string& reason) {
+            kLog.error("the daemon can no longer ask for PINs here: {}", reason);
+        });
+    std::optional<DesktopPrompter> prompter;
+    if (systemBus) prompter.emplace(loop.get(), (*systemBus)->get(), options.pinentry);
+    if (!prompter || !prompter->start())
+        kLog.error(
+            "the daemon cannot ask for PINs on this desktop: {}",
+            systemBus ? "the system bus does not take the service" : systemBus.refusal().text);
+
+    if (auto reason = (*bus)->claim(kAgentName); !reason.empty()) return {reason};
+    return {{}, loop.run()};
+}
+
+}  // namespace vlm::service

@@ -1,0 +1,162 @@
+#include "hints_machine.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <chrono>
+#include <regex>
+#include <thread>
+
+namespace vlm::test {
+
+namespace fs = std::filesystem;
+
+namespace {
+
+PrivateBus::Options installedPolicy() {
+    PrivateBus::Options options;
+    options.permissive = false;
+    options.includes = {VLM_BUS_POLICY};
+    return options;
+}
+
+PrivateBus::Options sessionBusOptions() {
+    PrivateBus::Options options;
+    options.type = "session";
+    return options;
+}
+
+}  // namespace
+
+// The build tree may lie where only its owner gets in, and some tests run its programs as another
+// user.
+HintsMachine::HintsMachine() : _systemBus(installedPolicy()), _sessionBus(sessionBusOptions()) {
+    for (const char* program : {VLM_HINTS_SERVICE, VLM_HINTS_CALL})
+        fs::copy_file(program, _folder.path() / fs::path(program).filename());
+    fs::create_directory(commonFolder());
+    chmod(commonFolder().c_str(), 01777);
+}
+
+void HintsMachine::insertCard(const std::string& name) {
+    _cards.add("Card", {tests::identity("p256", name)});
+    if (!_daemon) return;
+    const auto list = call({"op=1", "uid=-1"});
+    std::smatch found;
+    if (std::regex_search(list, found, std::regex("<([0-9a-fA-F]{64})>"))) _hash = found[1];
+    if (std::regex_search(list, found, std::regex("pkcs11:[^\", )}]*"))) _token = found[0];
+    ASSERT_FALSE(_hash.empty() || _token.empty()) << list;
+}
+
+std::vector<std::string> HintsMachine::daemonCommand(std::vector<std::string> moreArguments) const {
+    std::vector<std::string> command{
+        _folder.path() / "vlmhintsd", "--system", "--worker", VLM_TOKEN_WORKER, "--modules",
+        _cards.moduleDirectory()};
+    std::ranges::move(moreArguments, std::back_inserter(command));
+    if (std::ranges::find(command, "--database") == command.end()) {
+        command.push_back("--database");
+        command.push_back(_folder.path() / "state" / "hints.sqlite3");
+    }
+    return command;
+}
+
+void HintsMachine::startDaemon(std::vector<std::string> moreArguments) {
+    _daemon = std::make_unique<Child>(daemonCommand(std::move(moreArguments)), options());
+    waitForName(*_daemon, _systemBus, kDaemon);
+}
+
+void HintsMachine::startAgent(std::optional<uid_t> user, std::vector<std::string> moreArguments) {
+    std::vector<std::string> command{_folder.path() / "vlmhintsd", "--user"};
+    std::ranges::move(moreArguments, std::back_inserter(command));
+    _agent = std::make_unique<Child>(command, options(user));
+    waitForName(*_agent, _sessionBus, kAgent);
+}
+
+std::vector<std::string> HintsMachine::callCommand(
+    const std::string& name, const std::vector<std::string>& arguments) const {
+    std::vector<std::string> command{_folder.path() / "hints_call",
+                                     name == kDaemon ? "system" : "session", name};
+    std::ranges::copy(arguments, std::back_inserter(command));
+    return command;
+}
+
+std::string HintsMachine::call(const std::vector<std::string>& arguments,
+                               std::optional<uid_t> user) const {
+    return callOn(kDaemon, arguments, user);
+}
+
+std::string HintsMachine::callAgent(const std::vector<std::string>& arguments,
+                                    std::optional<uid_t> user) const {
+    return callOn(kAgent, arguments, user);
+}
+
+std::string HintsMachine::callOn(const std::string& name, const std::vector<std::string>& arguments,
+                                 std::optional<uid_t> user) const {
+    const auto ended = run(callCommand(name, arguments), options(user));
+    if (ended.status != 0) return "(the call ended badly) " + ended.errors;
+    return ended.output;
+}
+
+std::vector<std::string> HintsMachine::login(const std::vector<std::string>& more) const {
+    std::vector<std::string> arguments{"op=0", "dat1=" + _hash, "str1=" + _token, "uid=-1"};
+    std::ranges::copy(more, std::back_inserter(arguments));
+    return arguments;
+}
+
+std::vector<std::string> HintsMachine::pair(const std::string& account) const {
+    return {"op=2", "dat1=" + _hash, "str1=" + account};
+}
+
+std::string HintsMachine::pinentry(const std::string& script) const {
+    const auto path = _folder.write("pinentry", "#!/bin/sh\n" + script);
+    chmod(path.c_str(), 0755);
+    return path;
+}
+
+std::string HintsMachine::answeringPinentry() const {
+    return pinentry(
+        "echo OK\n"
+        "while read -r line; do\n"
+        "  case $line in GETPIN) echo 'D 123456' ;; BYE) echo OK; exit ;; esac\n"
+        "  echo OK\n"
+        "done\n");
+}
+
+Child::Options HintsMachine::options(std::optional<uid_t> user) const {
+    Child::Options options;
+    options.user = user;
+    options.environment = {{"DBUS_SYSTEM_BUS_ADDRESS", _systemBus.address()},
+                           {"DBUS_SESSION_BUS_ADDRESS", _sessionBus.address()},
+                           {"VLM_LOG_TARGET", "stderr"},
+                           {"DISPLAY", std::nullopt},
+                           {"WAYLAND_DISPLAY", std::nullopt}};
+    for (const auto& entry : _cards.environment()) {
+        const auto sign = entry.find('=');
+        options.environment[entry.substr(0, sign)] = entry.substr(sign + 1);
+    }
+    return options;
+}
+
+bool HintsMachine::hasOwner(const PrivateBus& bus, const std::string& name) const {
+    const auto ended = run({"busctl", "--address=" + bus.address(), "call", "org.freedesktop.DBus",
+                            "/", "org.freedesktop.DBus", "NameHasOwner", "s", name});
+    return ended.output == "b true\n";
+}
+
+bool HintsMachine::eventually(const std::function<bool()>& isSo) {
+    const auto deadline = std::chrono::steady_clock::now() + Child::kPatience;
+    while (!isSo()) {
+        if (std::chrono::steady_clock::now() > deadline) return false;
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return true;
+}
+
+void HintsMachine::waitForName(Child& instance, const PrivateBus& bus, const std::string& name) {
+    const bool isUp = eventually(
+        [&] { return instance.wait(std::chrono::milliseconds(0)) || hasOwner(bus, name); });
+    ASSERT_TRUE(isUp) << name << " is not on the bus";
+    ASSERT_FALSE(instance.wait(std::chrono::milliseconds(0))) << instance.errors();
+}
+
+}  // namespace vlm::test

@@ -1,0 +1,168 @@
+// The user's instance on a session bus of its own, and the daemon that it speaks to.
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <filesystem>
+#include <fstream>
+#include <regex>
+
+#include "hints_machine.h"
+
+namespace vlm::test {
+namespace {
+
+using testing::HasSubstr;
+using testing::StartsWith;
+
+TEST(UserInstanceWithoutADaemonTest, SaysThatTheDaemonDoesNotAnswer) {
+    HintsMachine machine;
+    machine.startAgent(std::nullopt);
+
+    EXPECT_THAT(machine.callAgent({"op=1", "uid=-1"}),
+                testing::AllOf(StartsWith("res -2014\n"), HasSubstr(kDaemon)));
+}
+
+TEST(UserInstanceWithoutADaemonTest, RefusesWhatOnlyTheDaemonDoes) {
+    HintsMachine machine;
+    machine.startAgent(std::nullopt);
+
+    for (const std::string operation : {"2", "3"})
+        EXPECT_THAT(
+            machine.callAgent({"op=" + operation, "dat1=" + std::string(64, '0'), "str1=alice"}),
+            testing::AllOf(StartsWith("res -2002\n"), HasSubstr(kDaemon)));
+    EXPECT_THAT(machine.callAgent({"op=6", "str1=alice"}), StartsWith("res -2002\n"));
+}
+
+TEST(UserInstanceWithoutADaemonTest, ServesWithoutASystemBus) {
+    HintsMachine machine;
+    machine.systemBus().stop();
+    machine.startAgent(std::nullopt);
+
+    EXPECT_THAT(machine.callAgent({"op=1", "uid=-1"}), StartsWith("res -2014\n"));
+    EXPECT_TRUE(machine.agent().waitForErrors("cannot ask for PINs on this desktop"));
+}
+
+class UserInstanceTest : public testing::Test {
+protected:
+    void SetUp() override {
+        if (geteuid() != 0) GTEST_SKIP() << "only root can start a daemon and another user's agent";
+    }
+
+    void start(const std::string& pinentry) {
+        machine.startDaemon();
+        machine.insertCard();
+        machine.startAgent(kNobodyUser, {"--pinentry", pinentry});
+        ASSERT_TRUE(isRegistered());
+    }
+    bool isRegistered() { return machine.agent().waitForErrors("through this instance"); }
+    // Its name on the system bus.
+    std::string connectionOfTheAgent() {
+        const auto list = run({"busctl", "--address=" + machine.systemBus().address(), "list",
+                               "--unique", "--no-legend"})
+                              .output;
+        std::smatch found;
+        const std::regex line("(:\\S+) +" + std::to_string(machine.agent().pid()) + " ");
+        return std::regex_search(list, found, line) ? found[1].str() : "(not in " + list + ")";
+    }
+    std::string note(const std::string& name) const {
+        std::ifstream stream(machine.commonFolder() / name);
+        std::string text;
+        std::getline(stream, text);
+        return text;
+    }
+
+    HintsMachine machine;
+};
+
+TEST_F(UserInstanceTest, PassesListingsOn) {
+    start(machine.answeringPinentry());
+
+    EXPECT_THAT(machine.callAgent({"op=1", "uid=-1"}, kNobodyUser), HasSubstr("Alice Example"));
+    EXPECT_THAT(machine.callAgent({"op=1", "uid=0"}, kNobodyUser), StartsWith("res -2001\n"));
+    EXPECT_THAT(machine.callAgent({"op=5", "uid=65534", "str1=x"}, kNobodyUser),
+                StartsWith("res -2002\n"));
+}
+
+TEST_F(UserInstanceTest, AsksItsUserForThePinOfALogin) {
+    start(machine.answeringPinentry());
+
+    EXPECT_EQ(machine.callAgent(machine.login(), kNobodyUser), "res 0\n");
+}
+
+TEST_F(UserInstanceTest, AsksAlsoForAProgramOfItsUserThatCallsTheDaemonItself) {
+    start(machine.answeringPinentry());
+
+    EXPECT_EQ(machine.call(machine.login(), kNobodyUser), "res 0\n");
+}
+
+TEST_F(UserInstanceTest, AsksForNoOtherUser) {
+    start(machine.answeringPinentry());
+
+    EXPECT_THAT(machine.call(machine.login(), kOtherUser), StartsWith("res -2006\n"));
+    EXPECT_THAT(machine.call(machine.login()), StartsWith("res -2006\n"));
+}
+
+TEST_F(UserInstanceTest, TellsThatItsUserCancelled) {
+    start(machine.pinentry(
+        "echo OK\n"
+        "while read -r line; do\n"
+        "  case $line in GETPIN) echo 'ERR 83886179 cancelled' ;; *) echo OK ;; esac\n"
+        "done\n"));
+
+    EXPECT_THAT(machine.callAgent(machine.login(), kNobodyUser),
+                testing::AllOf(StartsWith("res -2007\n"), HasSubstr("cancelled")));
+}
+
+TEST_F(UserInstanceTest, RegistersAgainWhenTheDaemonStartsAgain) {
+    start(machine.answeringPinentry());
+
+    machine.stopDaemon();
+    machine.startDaemon();
+
+    EXPECT_TRUE(HintsMachine::eventually(
+        [&] { return machine.callAgent(machine.login(), kNobodyUser) == "res 0\n"; }));
+}
+
+TEST_F(UserInstanceTest, IsForgottenWhenItEnds) {
+    start(machine.answeringPinentry());
+    ASSERT_EQ(machine.call(machine.login(), kNobodyUser), "res 0\n");
+
+    machine.agent().signal(SIGTERM);
+    ASSERT_EQ(machine.agent().wait(), 0);
+
+    EXPECT_THAT(machine.call(machine.login(), kNobodyUser), StartsWith("res -2006\n"));
+}
+
+TEST_F(UserInstanceTest, EndsThePromptWhenTheCallerIsGone) {
+    const auto pid = [&] { return note("pid"); };
+    const auto isOpen = [&] { return !pid().empty() && std::filesystem::exists("/proc/" + pid()); };
+    start(machine.pinentry("echo $$ >" + (machine.commonFolder() / "pid").string() +
+                           "; echo OK; exec sleep 1000\n"));
+    auto caller = std::make_unique<Child>(machine.callCommand(kAgent, machine.login()),
+                                          machine.options(kNobodyUser));
+    ASSERT_TRUE(HintsMachine::eventually(isOpen));
+
+    caller.reset();
+
+    EXPECT_TRUE(HintsMachine::eventually([&] { return !isOpen(); }));
+}
+
+TEST_F(UserInstanceTest, GivesNoPinToAnotherProgram) {
+    start(machine.answeringPinentry());
+    const std::string address = "--address=" + machine.systemBus().address();
+    const auto ask = [&](std::optional<uid_t> user) {
+        return run({"busctl", address, "call", connectionOfTheAgent(), "/org/vlm/token/hints",
+                    "org.vlm.token.hints.Prompter", "AskPin", "a{sv}", "3", "card", "s", "Card",
+                    "identity", "s", "Alice", "state", "t", "0"},
+                   machine.options(user));
+    };
+
+    EXPECT_THAT(ask(std::nullopt).output, HasSubstr("123456"));
+    EXPECT_THAT(ask(kNobodyUser).errors, HasSubstr("Access denied"));
+    EXPECT_THAT(ask(kOtherUser).errors, HasSubstr("Access denied"));
+}
+
+}  // namespace
+}  // namespace vlm::test

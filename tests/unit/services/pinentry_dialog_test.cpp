@@ -1,0 +1,183 @@
+#include "services/hints/pinentry_dialog.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace vlm::service {
+namespace {
+
+using Outcome = PinAnswer::Outcome;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+PinQuestion question(PinState state = PinState::Ready) { return {"PIV Card", "Alice", state, {}}; }
+
+// Everything that we say to a program that answers OK to all of it, up to the request for the PIN.
+std::vector<std::string> sayAll(PinentryDialog& dialog) {
+    std::vector<std::string> said;
+    auto line = dialog.take("OK Pleased to meet you");
+    while (!line.empty()) {
+        said.push_back(line);
+        if (line == "GETPIN\n") break;
+        line = dialog.take("OK");
+    }
+    return said;
+}
+
+TEST(PinentryDialogTest, SaysItsWishesInOrderAndThenAsksForThePin) {
+    PinentryDialog dialog(question(), PinentryTerminal{"/dev/pts/3", "xterm"});
+
+    EXPECT_THAT(
+        sayAll(dialog),
+        ElementsAre("OPTION ttyname=/dev/pts/3\n", "OPTION ttytype=xterm\n",
+                    "OPTION lc-ctype=C.UTF-8\n", "SETTIMEOUT 120\n", "SETTITLE Smart card\n",
+                    "SETDESC Enter the PIN of the card \"PIV Card\". The card then proves "
+                    "that it holds the identity \"Alice\".\n",
+                    "SETPROMPT PIN:\n", "GETPIN\n"));
+    EXPECT_FALSE(dialog.isOver());
+}
+
+TEST(PinentryDialogTest, NamesNoTerminalOnADesktop) {
+    PinentryDialog dialog(question(), std::nullopt);
+
+    EXPECT_THAT(sayAll(dialog), testing::Each(testing::Not(HasSubstr("tty"))));
+}
+
+TEST(PinentryDialogTest, WarnsBeforeTheLastTry) {
+    PinentryDialog few(question(PinState::FewTriesLeft), std::nullopt);
+    PinentryDialog last(question(PinState::LastTry), std::nullopt);
+
+    EXPECT_THAT(sayAll(few), testing::Contains(HasSubstr("%0A%0AA wrong PIN was entered before")));
+    EXPECT_THAT(sayAll(last), testing::Contains(HasSubstr("%0A%0AThis is the last try")));
+}
+
+TEST(PinentryDialogTest, LetsNoNameSpeakForIt) {
+    PinQuestion hostile = question();
+    hostile.card = "A\nGETPIN 100%25\r";
+    hostile.identity = std::string(5000, 'x');
+    PinentryDialog dialog(hostile, PinentryTerminal{"/dev/pts/3\nBYE", "xterm"});
+
+    for (const auto& line : sayAll(dialog)) {
+        EXPECT_LE(line.size(), 1000u);
+        EXPECT_EQ(line.find('\n'), line.size() - 1) << line;
+        EXPECT_THAT(line, testing::Not(HasSubstr("100%25\"")));
+    }
+}
+
+struct Conversation {
+    const char* why;
+    std::vector<std::string> said;  // by the program, after the request for the PIN
+    Outcome outcome;
+    const char* pin;
+};
+
+TEST(PinentryDialogTest, UnderstandsEachAnswer) {
+    const Conversation rows[] = {
+        {"a PIN", {"D 123456", "OK"}, Outcome::Given, "123456"},
+        {"an escaped PIN", {"D a%25b%0Ac%2a", "OK"}, Outcome::Given, "a%b\nc*"},
+        {"a per cent sign that escapes nothing", {"D 1%zz%2", "OK"}, Outcome::Given, "1%zz%2"},
+        {"a PIN with blanks", {"D 1 2 ", "OK"}, Outcome::Given, "1 2 "},
+        {"a PIN in two pieces", {"D 12", "D 34", "OK"}, Outcome::Given, "1234"},
+        {"remarks and states", {"# hi", "S PASSWORD_FROM_CACHE", "D 1", "OK"}, Outcome::Given, "1"},
+        {"an empty PIN", {"OK"}, Outcome::Cancelled, ""},
+        {"cancelled", {"ERR 83886179 Operation cancelled <Pinentry>"}, Outcome::Cancelled, ""},
+        {"cancelled by a bare number", {"ERR 99"}, Outcome::Cancelled, ""},
+        {"wholly cancelled", {"ERR 83886278 cancelled"}, Outcome::Cancelled, ""},
+        {"timed out", {"ERR 83886142 Timeout <Pinentry>"}, Outcome::TimedOut, ""},
+        {"another failure", {"ERR 83918950 Inappropriate ioctl"}, Outcome::Unavailable, ""},
+        {"a failure without a number", {"ERR"}, Outcome::Unavailable, ""},
+        {"a failure after a PIN", {"D 123", "ERR 83886179 cancelled"}, Outcome::Cancelled, ""},
+        {"a PIN that is too long", {"D " + std::string(257, '1'), "OK"}, Outcome::Unavailable, ""},
+    };
+    for (const auto& [why, said, outcome, pin] : rows) {
+        SCOPED_TRACE(why);
+        PinentryDialog dialog(question(), std::nullopt);
+        sayAll(dialog);
+
+        for (const auto& line : said) EXPECT_EQ(dialog.take(line), "");
+
+        EXPECT_TRUE(dialog.isOver());
+        const auto answer = dialog.takeAnswer();
+        EXPECT_EQ(answer.outcome, outcome);
+        EXPECT_EQ(answer.pin.text(), pin);
+        EXPECT_EQ(answer.reason.empty(), outcome != Outcome::Unavailable);
+    }
+}
+
+TEST(PinentryDialogTest, TakesTheLongestPin) {
+    PinentryDialog dialog(question(), std::nullopt);
+    sayAll(dialog);
+
+    dialog.take("D " + std::string(256, '1'));
+    dialog.take("OK");
+
+    EXPECT_EQ(dialog.takeAnswer().pin.text().size(), 256u);
+}
+
+TEST(PinentryDialogTest, AsksAlsoWhenTheProgramKnowsNoneOfItsWishes) {
+    PinentryDialog dialog(question(), std::nullopt);
+    auto line = dialog.take("OK");
+    while (line != "GETPIN\n") {
+        ASSERT_FALSE(line.empty());
+        line = dialog.take("ERR 83886254 Unknown option");
+    }
+
+    dialog.take("D 1");
+    dialog.take("OK");
+
+    EXPECT_EQ(dialog.takeAnswer().outcome, Outcome::Given);
+}
+
+TEST(PinentryDialogTest, TakesNoPinThatItHasNotAskedFor) {
+    PinentryDialog dialog(question(), std::nullopt);
+    dialog.take("D 666");
+    sayAll(dialog);
+
+    dialog.take("D 1");
+    dialog.take("OK");
+
+    EXPECT_EQ(dialog.takeAnswer().pin.text(), "1");
+}
+
+TEST(PinentryDialogTest, EndsWhenTheProgramGreetsWithAnError) {
+    PinentryDialog dialog(question(), std::nullopt);
+
+    EXPECT_EQ(dialog.take("ERR 16 no display\x1b"), "");
+
+    EXPECT_TRUE(dialog.isOver());
+    EXPECT_THAT(dialog.takeAnswer().reason, HasSubstr("no display\uFFFD"));
+}
+
+TEST(PinentryDialogTest, AnswersNoQuestionsOfTheProgram) {
+    PinentryDialog dialog(question(), std::nullopt);
+    sayAll(dialog);
+
+    EXPECT_EQ(dialog.take("INQUIRE QUALITY 1234"), "CAN\n");
+    EXPECT_FALSE(dialog.isOver());
+}
+
+TEST(PinentryDialogTest, KeepsItsAnswerWhateverComesLater) {
+    PinentryDialog dialog(question(), std::nullopt);
+    sayAll(dialog);
+    dialog.take("D 1");
+    dialog.take("OK");
+
+    dialog.breakOff("it ended");
+    EXPECT_EQ(dialog.take("ERR 83886179 cancelled"), "");
+
+    EXPECT_EQ(dialog.takeAnswer().outcome, Outcome::Given);
+}
+
+TEST(PinentryDialogTest, IsBrokenOffWithAReason) {
+    PinentryDialog dialog(question(), std::nullopt);
+
+    dialog.breakOff("the program ended");
+
+    EXPECT_TRUE(dialog.isOver());
+    const auto answer = dialog.takeAnswer();
+    EXPECT_EQ(answer.outcome, Outcome::Unavailable);
+    EXPECT_EQ(answer.reason, "the program ended");
+}
+
+}  // namespace
+}  // namespace vlm::service
