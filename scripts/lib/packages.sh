@@ -1,0 +1,45 @@
+# The Debian packages that this project needs, by purpose, and how to get those that are missing.
+
+build_packages=(
+    ca-certificates ccache cmake g++ gettext ninja-build pkg-config
+    libp11-kit-dev libseccomp-dev libsqlite3-dev libsqlitecpp-dev libssl-dev libsystemd-dev
+)
+
+# A software card, the standard tools that fill it, and a message bus.
+demo_packages=(dbus opensc openssl p11-kit-modules softhsm2)
+
+test_packages=(
+    gcovr gnutls-bin libgmock-dev libgtest-dev p11-kit pinentry-tty procps shellcheck systemd
+    clang clang-format clang-tidy libclang-rt-14-dev
+)
+
+# install_packages NAME... : installs those that are missing, and asks nothing.
+install_packages() {
+    local missing=() package become=()
+    for package in "$@"; do
+        [[ $(dpkg-query -W -f '${db:Status-Status}' "$package" 2>/dev/null) == installed ]] ||
+            missing+=("$package")
+    done
+    ((${#missing[@]})) || return 0
+
+    if ((EUID != 0)); then
+        command -v sudo >/dev/null || {
+            echo "These packages are missing, and there is no sudo to install them: ${missing[*]}" >&2
+            return 1
+        }
+        become=(sudo)
+    fi
+    echo "Installing ${missing[*]}"
+    local log
+    log=$(mktemp)
+    if ! { "${become[@]}" apt-get -q -o DPkg::Lock::Timeout=600 update &&
+        "${become[@]}" env DEBIAN_FRONTEND=noninteractive apt-get -q -y \
+            -o DPkg::Lock::Timeout=600 install --no-install-recommends "${missing[@]}"; } \
+        </dev/null >"$log" 2>&1; then
+        tail -n 20 "$log" >&2
+        echo "The packages could not be installed; apt's last words are above." >&2
+        rm -f "$log"
+        return 1
+    fi
+    rm -f "$log"
+}
