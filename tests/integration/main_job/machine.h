@@ -1,0 +1,52 @@
+// Machine: a private system bus under the policy that gets installed, software cards, the real
+// hints service and a home folder, for running the real vlmbind against.
+
+#pragma once
+
+#include <filesystem>
+#include <map>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "tests/integration/linux/child.h"
+#include "tests/integration/linux/private_bus.h"
+#include "tests/integration/linux/temporary_folder.h"
+#include "tests/tools/soft_card/soft_cards.h"
+
+namespace vlm::test {
+
+class Machine {
+public:
+    Machine();
+
+    SoftCards cards;
+
+    // The service, with somebody at its pinentry who types this.
+    void startService(const std::string& typedPin = SoftCards::kPin);
+    void stopService();
+
+    // The tool, where every user may run it.
+    std::filesystem::path tool() const { return _folder.path() / "tree" / "bin" / "vlmbind"; }
+
+    // Runs the tool to its end, as the user that the test runs as or as another; run() the same
+    // with a whole command.
+    Ended vlmbind(std::vector<std::string> arguments, std::optional<uid_t> user = std::nullopt,
+                  std::map<std::string, std::optional<std::string>> environment = {});
+    Ended run(std::vector<std::string> command, std::vector<std::string> arguments,
+              std::optional<uid_t> user = std::nullopt,
+              std::map<std::string, std::optional<std::string>> environment = {});
+
+    // What the service wrote to its log so far.
+    const std::string& serviceLog();
+
+private:
+    std::map<std::string, std::optional<std::string>> environment() const;
+
+    TemporaryFolder _folder;
+    PrivateBus _bus;
+    std::unique_ptr<Child> _service;
+};
+
+}  // namespace vlm::test
