@@ -31,7 +31,7 @@ if(CCACHE)
 endif()
 
 add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor -Wold-style-cast
-                    -Wcast-qual -Woverloaded-virtual -Wnull-dereference -Wformat=2
+                    -Wcast-qual -Woverloaded-virtual -Wformat=2
                     $<$<CXX_COMPILER_ID:GNU>:-Wduplicated-cond>
                     $<$<CXX_COMPILER_ID:GNU>:-Wlogical-op>)
 if(VLM_WARNINGS_AS_ERRORS)
@@ -46,8 +46,10 @@ if(CMAKE_BUILD_TYPE MATCHES "Rel" AND NOT VLM_SANITIZERS)
 endif()
 
 if(VLM_SANITIZERS)
+    # The code that sanitizers add makes GCC believe that moved variants are not initialised.
     add_compile_options(-fsanitize=${VLM_SANITIZERS} -fno-sanitize-recover=all
-                        -fno-omit-frame-pointer)
+                        -fno-omit-frame-pointer
+                        $<$<CXX_COMPILER_ID:GNU>:-Wno-maybe-uninitialized>)
     add_link_options(-fsanitize=${VLM_SANITIZERS})
 endif()
 if(VLM_COVERAGE)

@@ -18,6 +18,32 @@ using platform::Message;
 
 }  // namespace
 
+// One request, from its coming to its answer.
+class BusServer::Waiting {
+public:
+    Waiting(std::weak_ptr<Counts> counts, platform::UserId user, sd_bus_message* call)
+        : _counts(std::move(counts)), _user(user), _call(sd_bus_message_ref(call)) {
+        if (const auto all = _counts.lock()) ++(*all)[_user];
+    }
+    Waiting(const Waiting&) = delete;
+    Waiting& operator=(const Waiting&) = delete;
+    ~Waiting() { end(); }
+
+    // The call to answer; null when it was answered, or the server is gone.
+    platform::SdBusMessage end() {
+        const auto all = _counts.lock();
+        if (!_call || !all) return nullptr;
+        const auto ofUser = all->find(_user);
+        if (--ofUser->second == 0) all->erase(ofUser);
+        return std::move(_call);
+    }
+
+private:
+    std::weak_ptr<Counts> _counts;
+    platform::UserId _user;
+    platform::SdBusMessage _call;
+};
+
 BusServer::BusServer(sd_bus* bus, const char* interface, const char* method, Exchanges& exchanges)
     : _bus(bus),
       _interface(interface),
@@ -45,8 +71,10 @@ int BusServer::onCall(sd_bus_message* call, void* self, sd_bus_error*) {
 void BusServer::receive(sd_bus_message* call) {
     const auto caller = callerOf(call);
     if (!caller) return;
-    if (const auto refusal = refuseMore(caller->user)) return send(call, refusalReply(*refusal));
-
+    if (isFull(caller->user))
+        return send(call, refusalReply({status::kBusy,
+                                        "Too many requests wait for the hints service already. "
+                                        "Try again when some of them are answered."}));
     std::string reason;
     auto read = platform::readDictionary(call, reason);
     if (!read)
@@ -55,24 +83,18 @@ void BusServer::receive(sd_bus_message* call) {
     IncomingRequest request{std::move(read->message), std::move(read->foreignKeys)};
     std::ranges::move(read->repeatedKeys, std::back_inserter(request.unreadableKeys));
 
-    const auto number = ++_last;
-    _waiting[number] = {platform::SdBusMessage(sd_bus_message_ref(call)), caller->user};
-    _exchanges.handle(*caller, request,
-                      [this, alive = std::weak_ptr(_alive), number](const Message& reply) {
-                          if (alive.expired()) return;
-                          const auto answered = _waiting.extract(number);
-                          if (answered) send(answered.mapped().call.get(), reply);
-                      });
+    const auto waiting = std::make_shared<Waiting>(_counts, caller->user, call);
+    _exchanges.handle(*caller, request, [this, waiting](const Message& reply) {
+        if (const auto answered = waiting->end()) send(answered.get(), reply);
+    });
 }
 
-std::optional<Refusal> BusServer::refuseMore(platform::UserId user) const {
-    const auto ofUser = std::ranges::count_if(
-        _waiting, [&](const auto& waiting) { return waiting.second.user == user; });
-    if (_waiting.size() < kMostWaiting && static_cast<std::size_t>(ofUser) < kMostWaitingOfOneUser)
-        return std::nullopt;
-    return Refusal{status::kBusy,
-                   "Too many requests wait for the hints service already. Try again when some of "
-                   "them are answered."};
+bool BusServer::isFull(platform::UserId user) const {
+    std::size_t all = 0;
+    for (const auto& [each, waiting] : *_counts) all += waiting;
+    const auto ofUser = _counts->find(user);
+    return all >= kMostWaiting ||
+           (ofUser != _counts->end() && ofUser->second >= kMostWaitingOfOneUser);
 }
 
 void BusServer::send(sd_bus_message* call, const Message& content) {

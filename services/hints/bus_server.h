@@ -2,7 +2,8 @@
 //
 // Who calls is asked of the bus. Answers may come in any order and at any time; a caller that has
 // left gets none. There is a bound on the requests that wait for their answers, for each user and
-// in all, so that nobody can use up this program's memory or keep others out.
+// in all, so that nobody can use up this program's memory or keep others out. A request waits until
+// it is answered, or until the last copy of its reply is gone.
 //
 // Ownership: the bus and the exchanges outlive it. Threads: the event loop's.
 // Blocking:  asks the bus once a request.
@@ -14,15 +15,12 @@
 #include <systemd/sd-bus.h>
 
 #include <array>
-#include <cstdint>
+#include <cstddef>
 #include <map>
 #include <memory>
-#include <optional>
-#include <string>
 
 #include "platform/linux/sd_bus_handles.h"
 #include "services/hints/exchanges.h"
-#include "services/hints/outcome.h"
 
 namespace vlm::service {
 
@@ -40,14 +38,14 @@ public:
     bool start();
 
 private:
-    struct Waiting {
-        platform::SdBusMessage call;
-        platform::UserId user;
-    };
+    // How many requests wait, of each user who has any.
+    using Counts = std::map<platform::UserId, std::size_t>;
+
+    class Waiting;
 
     static int onCall(sd_bus_message* call, void* self, sd_bus_error* error);
     void receive(sd_bus_message* call);
-    std::optional<Refusal> refuseMore(platform::UserId user) const;
+    bool isFull(platform::UserId user) const;
     void send(sd_bus_message* call, const platform::Message& content);
 
     sd_bus* _bus;
@@ -55,11 +53,9 @@ private:
     Exchanges& _exchanges;
     std::array<sd_bus_vtable, 3> _members;
     platform::SdBusSlot _slot;
-    std::map<std::uint64_t, Waiting> _waiting;
-    std::uint64_t _last = 0;
 
-    // Answers that come after the server is gone find this gone, too.
-    std::shared_ptr<int> _alive = std::make_shared<int>();
+    // Shared with the requests that wait; answers that come after the server find it gone.
+    std::shared_ptr<Counts> _counts = std::make_shared<Counts>();
 };
 
 }  // namespace vlm::service

@@ -23,7 +23,15 @@ namespace vlm::service {
 
 namespace {
 
-// The next lines run in the child, between fork and exec.
+std::vector<char*> pointersTo(std::vector<std::string>& texts) {
+    std::vector<char*> pointers;
+    pointers.reserve(texts.size() + 1);
+    for (auto& text : texts) pointers.push_back(text.data());
+    pointers.push_back(nullptr);
+    return pointers;
+}
+
+// The next functions run in the child, between fork and exec.
 
 void becomeUser(uid_t user, gid_t group) {
     if (setgroups(1, &group) != 0 || setresgid(group, group, group) != 0 ||
@@ -49,7 +57,8 @@ void takeStreams(int socket) {
     syscall(SYS_close_range, STDERR_FILENO + 1, ~0U, 0);
 }
 
-[[noreturn]] void runInChild(const ProgramToRun& program, int socket, char* const* environment) {
+[[noreturn]] void runInChild(const ProgramToRun& program, int socket, pid_t parent,
+                             char* const* arguments, char* const* environment) {
     takeDefaultSignals();
     takeStreams(socket);
     setsid();
@@ -59,9 +68,8 @@ void takeStreams(int socket) {
     prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
     // After the change of user, which forgets it.
     prctl(PR_SET_PDEATHSIG, SIGKILL);
-    std::string path = program.path;
-    char* arguments[] = {path.data(), nullptr};
-    execve(path.c_str(), arguments, environment);
+    if (getppid() != parent) _exit(127);  // it ended before that
+    execve(arguments[0], arguments, environment);
     _exit(127);
 }
 
@@ -81,14 +89,17 @@ Outcome<ChildProgram> ChildProgram::start(const ProgramToRun& program) {
     const platform::FileDescriptor theirs(ends[1]);
     fcntl(ours.get(), F_SETFL, O_NONBLOCK);
 
+    std::vector<std::string> arguments{program.path};
     auto environment = program.environment;
-    std::vector<char*> pointers;
-    for (auto& entry : environment) pointers.push_back(entry.data());
-    pointers.push_back(nullptr);
+    const auto argumentPointers = pointersTo(arguments);
+    const auto environmentPointers = pointersTo(environment);
 
+    const pid_t parent = getpid();
     const pid_t process = fork();
     if (process < 0) return failed(program, errno);
-    if (process == 0) runInChild(program, theirs.get(), pointers.data());
+    if (process == 0)
+        runInChild(program, theirs.get(), parent, argumentPointers.data(),
+                   environmentPointers.data());
     return ChildProgram(process, std::move(ours));
 }
 

@@ -42,7 +42,8 @@ std::set<Bytes> hashesOn(const std::vector<Token>& tokens) {
 }
 
 // The hashes under "0", "1" and so on; with `inserted`, only those in it.
-Message pairingsReply(const std::vector<Pairing>& pairings, const std::set<Bytes>* inserted) {
+Outcome<Message> pairingsReply(const std::vector<Pairing>& pairings,
+                               const std::set<Bytes>* inserted) {
     PropertyList::Dictionary hashes;
     for (const auto& pairing : pairings)
         if (!inserted || inserted->contains(pairing.hash))
@@ -122,12 +123,7 @@ Outcome<Message> HintsService::describeTokens(const Caller& caller, const std::s
     TokenInfoRequest request{.onlyToken = onlyToken, .now = _parts.now()};
     if (!caller.isRoot())
         request.onlyAccount = platform::current().accounts().userName(caller.user).value_or("");
-    auto context = platform::writeBinaryPropertyList(tokenInfo(tokens, pairings, request));
-    if (!context)
-        return Refusal{status::kCardFailed,
-                       "Listing the inserted cards: their identities are too many to be sent. "
-                       "Take some cards out and try again."};
-    return listReply(PropertyList::Dictionary{{"ctx", std::move(*context)}});
+    return tokenInfoReply(tokenInfo(tokens, pairings, request));
 }
 
 Outcome<Message> HintsService::pair(const Caller& caller, const Request& request) {
@@ -140,7 +136,8 @@ Outcome<Message> HintsService::pair(const Caller& caller, const Request& request
     if (const auto failure = _parts.pairings.pair(*account, request.hash, _parts.now()))
         return *failure;
     _proofs.useUp(caller.user, request.hash);
-    kLog.notice("paired {} with {} for user {}", *account, shownHash(request.hash), caller.user);
+    kLog.notice("paired {} with {} for user {}", shownText(*account), shownHash(request.hash),
+                caller.user);
     return numberReply(status::kSuccess);
 }
 

@@ -18,7 +18,7 @@ std::string triesLeft(PinState state) {
         case PinState::Ready:
             return {};
         case PinState::FewTriesLeft:
-            return "; only few tries are left";
+            return "; only a few tries are left";
         case PinState::LastTry:
             return "; only one try is left";
         case PinState::Locked:

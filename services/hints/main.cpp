@@ -1,7 +1,7 @@
 // vlmhintsd: the hints service, as the machine's daemon or as one user's instance.
 
-#include <cstdio>
 #include <cstdlib>
+#include <iostream>
 #include <string>
 #include <vector>
 
@@ -13,19 +13,19 @@ int main(int argc, char* argv[]) {
     using namespace vlm::service;
     const auto parsed = parseOptions(std::vector<std::string>(argv + 1, argv + argc));
     if (!parsed.options) {
-        std::fputs(parsed.text.c_str(), parsed.exitStatus == 0 ? stdout : stderr);
+        (parsed.exitStatus == 0 ? std::cout : std::cerr) << parsed.text;
         return parsed.exitStatus;
     }
 
     ServiceLoop loop;
     if (!loop.get()) {
-        std::fputs("vlmhintsd: the system has no room for an event loop\n", stderr);
+        std::cerr << "vlmhintsd: the system has no room for an event loop\n";
         return EXIT_FAILURE;
     }
     const auto end = parsed.options->instance == Instance::System
                          ? runSystemInstance(loop, *parsed.options)
                          : runUserInstance(loop, *parsed.options);
     if (end.whyNotStarted.empty()) return end.exitStatus;
-    std::fprintf(stderr, "vlmhintsd: %s\n", end.whyNotStarted.c_str());
+    std::cerr << "vlmhintsd: " << end.whyNotStarted << "\n";
     return EXIT_FAILURE;
 }

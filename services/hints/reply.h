@@ -14,7 +14,10 @@ namespace vlm::service {
 platform::Message numberReply(std::int64_t number);
 
 // "res" is the value as a binary property list.
-platform::Message listReply(const platform::PropertyList& value);
+Outcome<platform::Message> listReply(const platform::PropertyList& value);
+
+// "res" is a list with one entry, "ctx": the record as a binary property list of its own.
+Outcome<platform::Message> tokenInfoReply(const platform::PropertyList& record);
 
 // "res" is the refusal's status, and the error entry holds it with its text.
 platform::Message refusalReply(const Refusal& refusal);

@@ -7,15 +7,25 @@
 
 namespace vlm::service {
 
+namespace {
+
+void ignore(int signal) {
+    struct sigaction ignoring = {};
+    ignoring.sa_handler = SIG_IGN;
+    sigaction(signal, &ignoring, nullptr);
+}
+
+}  // namespace
+
 ServiceLoop::ServiceLoop() {
     sigset_t ending;
     sigemptyset(&ending);
     sigaddset(&ending, SIGTERM);
     sigaddset(&ending, SIGINT);
     sigprocmask(SIG_BLOCK, &ending, nullptr);
-    std::signal(SIGPIPE, SIG_IGN);
+    ignore(SIGPIPE);
     // Started in the background of a shell, the service puts terminals right that it does not own.
-    std::signal(SIGTTOU, SIG_IGN);
+    ignore(SIGTTOU);
 
     sd_event* made = nullptr;
     if (sd_event_new(&made) < 0) return;

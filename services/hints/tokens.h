@@ -10,8 +10,8 @@
 // Blocking:  never; a card module that hangs is given up after a time limit, and costs only what
 //            was asked of it.
 // Errors:    a module that fails is one warning line in the log; the other tokens are listed.
-// Behind it: services/hints/worker_tokens.h
-// In tests:  tests/fakes/fake_tokens.h, tests/integration/worker_tokens_test.cpp
+// Behind it: services/hints/tokens/worker_tokens.h
+// In tests:  tests/fakes/fake_tokens.h, tests/integration/tokens/
 
 #pragma once
 

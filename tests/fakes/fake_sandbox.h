@@ -28,8 +28,7 @@ public:
         std::string_view profileName,
         const std::vector<platform::SandboxParameter>& parameters) override {
         Entered record{std::string(profileName), {}};
-        for (const auto& each : parameters)
-            record.parameters.emplace_back(each.name, each.value);
+        for (const auto& each : parameters) record.parameters.emplace_back(each.name, each.value);
         entered.push_back(std::move(record));
         return answer;
     }

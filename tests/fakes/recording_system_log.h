@@ -23,8 +23,8 @@ public:
 
     void write(const platform::LogRecord& record) override {
         const std::lock_guard lock(_mutex);
-        _lines.push_back({std::string(record.subsystem), std::string(record.category),
-                          record.level, std::string(record.text)});
+        _lines.push_back({std::string(record.subsystem), std::string(record.category), record.level,
+                          std::string(record.text)});
     }
 
     std::vector<Line> lines() const {

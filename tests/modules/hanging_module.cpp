@@ -1,10 +1,15 @@
-// Never answers when it is asked about a token.
+// Never answers when it is asked about a token. It makes the file that VLM_TEST_HANGING names when
+// that has begun.
 
 #include <unistd.h>
+
+#include <cstdlib>
+#include <fstream>
 
 #include "tests/modules/real_module.h"
 
 static CK_RV hang(CK_SLOT_ID, CK_TOKEN_INFO*) {
+    if (const char* file = std::getenv("VLM_TEST_HANGING")) std::ofstream(file) << "hanging";
     for (;;) pause();
 }
 

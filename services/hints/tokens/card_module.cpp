@@ -18,6 +18,8 @@ bool meansNoToken(CK_RV result) {
            result == CKR_SLOT_ID_INVALID || result == CKR_TOKEN_NOT_RECOGNIZED;
 }
 
+bool isTrouble(CK_RV result) { return result != CKR_OK && !meansNoToken(result); }
+
 // The flags that say what kind of token it is; the others tell of its state and change often.
 CK_FLAGS kindOf(CK_FLAGS flags) {
     return flags & (CKF_LOGIN_REQUIRED | CKF_PROTECTED_AUTHENTICATION_PATH | CKF_TOKEN_INITIALIZED);
@@ -29,29 +31,30 @@ CardModule::CardModule(std::unique_ptr<Pkcs11Module> module,
                        std::chrono::milliseconds lookAgainAfter)
     : _module(std::move(module)), _lookAgainAfter(lookAgainAfter), _looked(steady_clock::now()) {}
 
-std::vector<SlotToken> CardModule::presentTokens() {
-    const bool due = steady_clock::now() - _looked >= _lookAgainAfter;
-    auto tokens = due ? std::vector<SlotToken>{} : _module->tokens();
-    // A software token whose files were taken away fails from then on, until it is looked for anew.
-    const bool failed = std::ranges::any_of(
-        tokens, [](CK_RV result) { return result != CKR_OK && !meansNoToken(result); },
-        &SlotToken::result);
-    if ((due || failed) && _module->isSoftware()) {
+// None when the module does not even tell its slots.
+std::optional<std::vector<SlotToken>> CardModule::presentTokens() {
+    if (steady_clock::now() - _looked < _lookAgainAfter) {
+        auto tokens = _module->tokens();
+        // A software token whose files were taken away fails until it is looked for anew.
+        const bool failed = !tokens || std::ranges::any_of(*tokens, isTrouble, &SlotToken::result);
+        if (!failed) return tokens;
+    }
+    if (_module->isSoftware()) {
         for (auto& [fields, token] : _known) token.session.reset();
         _module->reinitialize();
-        _looked = steady_clock::now();
-    } else if (!due) {
-        return tokens;
     }
+    _looked = steady_clock::now();
     return _module->tokens();
 }
 
 CardModule::Listing CardModule::list(std::int64_t now) {
     Listing listing;
     KnownTokens present;
-    for (const SlotToken& slotToken : presentTokens()) {
+    const auto slotTokens = presentTokens();
+    if (!slotTokens) listing.problems.emplace_back("it does not tell its slots");
+    for (const SlotToken& slotToken : slotTokens.value_or(std::vector<SlotToken>{})) {
         if (slotToken.result != CKR_OK) {
-            if (!meansNoToken(slotToken.result))
+            if (isTrouble(slotToken.result))
                 listing.problems.push_back(
                     platform::text("a card in slot {} gives no information: {}", slotToken.slot,
                                    resultText(slotToken.result)));
@@ -97,7 +100,8 @@ const TokenObjects* CardModule::objectsOf(const SlotToken& token, KnownTokens& p
 }
 
 Proof CardModule::prove(ProofRequest request) {
-    for (const SlotToken& slotToken : _module->tokens()) {
+    const auto slotTokens = _module->tokens();
+    for (const SlotToken& slotToken : slotTokens.value_or(std::vector<SlotToken>{})) {
         if (slotToken.result != CKR_OK ||
             tokenIdentifier(slotToken.fields) != request.tokenIdentifier)
             continue;

@@ -39,7 +39,7 @@ private:
     };
     using KnownTokens = std::map<TokenFields, KnownToken>;
 
-    std::vector<SlotToken> presentTokens();
+    std::optional<std::vector<SlotToken>> presentTokens();
     const TokenObjects* objectsOf(const SlotToken& token, KnownTokens& present);
 
     std::unique_ptr<Pkcs11Module> _module;

@@ -61,6 +61,11 @@ void CardWorker::startNext() {
     _idle.reset();
     _current = std::move(_waiting.front());
     _waiting.pop_front();
+    if (_current->proof && !encodeProofRequest(*_current->proof))
+        return finishProof({Proof::Outcome::CardFailed,
+                            {},
+                            PinState::Ready,
+                            "the PIN or the challenge is longer than any card takes"});
     // Time spent in the queue is not held against the worker.
     _current->limit = callAfter(_event, limitOf(*_current),
                                 [this] { fail("did not answer in time and was ended"); });
@@ -146,9 +151,10 @@ void CardWorker::finishProof(Proof proof) {
 void CardWorker::goIdle() {
     _current.reset();
     scheduleStart();
+    if (!_process) return;
     _idle = callAfter(_event, _limits.idle, [this] {
         _readable.reset();
-        if (_process) _graveyard.letLeave(std::move(*_process));
+        _graveyard.letLeave(std::move(*_process));
         _process.reset();
     });
 }

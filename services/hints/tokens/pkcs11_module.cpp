@@ -46,12 +46,12 @@ Pkcs11Module::~Pkcs11Module() {
     p11_kit_module_release(_module);
 }
 
-CK_RV Pkcs11Module::reinitialize() {
+void Pkcs11Module::reinitialize() {
     p11_kit_module_finalize(_module);
-    return p11_kit_module_initialize(_module);
+    p11_kit_module_initialize(_module);
 }
 
-std::vector<CK_SLOT_ID> Pkcs11Module::slots(bool withToken) const {
+std::optional<std::vector<CK_SLOT_ID>> Pkcs11Module::slots(bool withToken) const {
     // Asking for the number first makes a module look again at what is there.
     CK_ULONG count = 0;
     if (_module->C_GetSlotList(withToken, nullptr, &count) != CKR_OK) return {};
@@ -63,9 +63,11 @@ std::vector<CK_SLOT_ID> Pkcs11Module::slots(bool withToken) const {
     return slots;
 }
 
-std::vector<SlotToken> Pkcs11Module::tokens() const {
+std::optional<std::vector<SlotToken>> Pkcs11Module::tokens() const {
+    const auto withToken = slots(true);
+    if (!withToken) return {};
     std::vector<SlotToken> tokens;
-    for (const CK_SLOT_ID slot : slots(true)) tokens.push_back(tokenIn(slot));
+    for (const CK_SLOT_ID slot : *withToken) tokens.push_back(tokenIn(slot));
     return tokens;
 }
 
@@ -82,7 +84,8 @@ SlotToken Pkcs11Module::tokenIn(CK_SLOT_ID slot) const {
 }
 
 bool Pkcs11Module::isSoftware() const {
-    return std::ranges::none_of(slots(false), [this](CK_SLOT_ID slot) {
+    const auto all = slots(false);
+    return !all || std::ranges::none_of(*all, [this](CK_SLOT_ID slot) {
         CK_SLOT_INFO info = {};
         return _module->C_GetSlotInfo(slot, &info) == CKR_OK && (info.flags & CKF_HW_SLOT) != 0;
     });

@@ -77,11 +77,13 @@ public:
     Pkcs11Module(const Pkcs11Module&) = delete;
     Pkcs11Module& operator=(const Pkcs11Module&) = delete;
 
-    // Ends and begins the module's work; its sessions are gone after that.
-    CK_RV reinitialize();
+    // Ends and begins the module's work; its sessions are gone after that. A module that does not
+    // begin again answers nothing from then on.
+    void reinitialize();
 
-    // The slots that hold a token, and the tokens, whatever state they are in.
-    std::vector<SlotToken> tokens() const;
+    // The slots that hold a token, and the tokens, whatever state they are in; none when the
+    // module does not tell its slots.
+    std::optional<std::vector<SlotToken>> tokens() const;
     SlotToken tokenIn(CK_SLOT_ID slot) const;
 
     // Whether no slot stands for a machine's device: nothing announces a new token then.
@@ -92,7 +94,7 @@ public:
 
 private:
     explicit Pkcs11Module(CK_FUNCTION_LIST* module) : _module(module) {}
-    std::vector<CK_SLOT_ID> slots(bool withToken) const;
+    std::optional<std::vector<CK_SLOT_ID>> slots(bool withToken) const;
 
     CK_FUNCTION_LIST* _module;
 };

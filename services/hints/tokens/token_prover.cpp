@@ -145,8 +145,8 @@ std::vector<TokenProver::PrivateKey> TokenProver::keysOf(const Pkcs11Session& se
             keys.push_back({handle, always, same});
         }
     }
-    std::ranges::stable_partition(
-        keys, [](SameKey same) { return same == SameKey::Yes; }, &PrivateKey::sameKey);
+    std::stable_partition(keys.begin(), keys.end(),
+                          [](const PrivateKey& key) { return key.sameKey == SameKey::Yes; });
     return keys;
 }
 

@@ -4,7 +4,6 @@
 //   vlm-token-worker LOOK-AGAIN-MILLISECONDS MODULE-PATH
 
 #include <sys/prctl.h>
-#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -23,12 +22,8 @@ namespace {
 constexpr int kSocket = 3;
 constexpr unsigned kSecondsToLeave = 5;
 
-// A PIN passes through this process: nothing of its memory may be kept or looked at.
-void closeToOthers() {
-    const rlimit none = {0, 0};
-    setrlimit(RLIMIT_CORE, &none);
-    prctl(PR_SET_DUMPABLE, 0);
-}
+// A PIN passes through this process: its memory may neither be kept nor be looked at.
+void closeToOthers() { prctl(PR_SET_DUMPABLE, 0); }
 
 class Worker {
 public:

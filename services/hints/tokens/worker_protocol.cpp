@@ -154,8 +154,10 @@ std::optional<Token> decodeToken(const PropertyList& value) {
     }
     if (entries.failed() || !isIdentifier(token.identifier)) return {};
     std::ranges::sort(token.identities, {}, &Identity::publicKeyHash);
-    const auto twice = std::ranges::unique(token.identities, {}, &Identity::publicKeyHash);
-    token.identities.erase(twice.begin(), twice.end());
+    const auto twice = std::unique(
+        token.identities.begin(), token.identities.end(),
+        [](const Identity& a, const Identity& b) { return a.publicKeyHash == b.publicKeyHash; });
+    token.identities.erase(twice, token.identities.end());
     return token;
 }
 

@@ -1,8 +1,9 @@
 #include "services/hints/tokens/worker_tokens.h"
 
 #include <algorithm>
-#include <filesystem>
 #include <utility>
+
+#include "services/hints/tokens/card_text.h"
 
 namespace vlm::service {
 
@@ -13,8 +14,8 @@ WorkerTokens::WorkerTokens(sd_event* event, const WorkerTokensOptions& options)
         command.arguments = {options.workerProgram, std::to_string(options.lookAgainAfter.count()),
                              module.path};
         command.environment = options.environment;
-        _workers.push_back(std::make_unique<CardWorker>(event, _graveyard, module.name,
-                                                        std::move(command), options.limits));
+        _workers.push_back(std::make_unique<CardWorker>(
+            event, _graveyard, harmlessText(module.name), std::move(command), options.limits));
     }
 }
 
@@ -38,8 +39,10 @@ void WorkerTokens::finishRound() {
         tokens.insert(tokens.end(), worker->lastTokens().begin(), worker->lastTokens().end());
     // The sort keeps a more important module's token before another module's same one.
     std::ranges::stable_sort(tokens, {}, &Token::identifier);
-    const auto twice = std::ranges::unique(tokens, {}, &Token::identifier);
-    tokens.erase(twice.begin(), twice.end());
+    const auto twice =
+        std::unique(tokens.begin(), tokens.end(),
+                    [](const Token& a, const Token& b) { return a.identifier == b.identifier; });
+    tokens.erase(twice, tokens.end());
 
     // An asker may ask again at once; that is a new round.
     const auto askers = std::exchange(_askers, {});

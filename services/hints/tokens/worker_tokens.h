@@ -29,7 +29,8 @@ struct WorkerTokensOptions {
 
 class WorkerTokens final : public Tokens {
 public:
-    // The loop must outlive this; answers that are missing at the end of it do not come.
+    // The loop must outlive this; answers that are missing at the end of it do not come, and no
+    // answer may bring that end about.
     WorkerTokens(sd_event* event, const WorkerTokensOptions& options);
 
     void list(std::function<void(std::vector<Token>)> answer) override;

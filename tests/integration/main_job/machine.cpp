@@ -1,6 +1,7 @@
 #include "machine.h"
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <csignal>
 
@@ -29,7 +30,8 @@ Machine::Machine() : _bus(installedPolicy()) {
         std::filesystem::copy(from / "bin" / program, to / "bin" / program);
     for (const auto& file : std::filesystem::directory_iterator(from / "lib"))
         if (file.path().filename().string().starts_with("libvlm.so"))
-            std::filesystem::copy(file, to / "lib", std::filesystem::copy_options::copy_symlinks);
+            std::filesystem::copy(file, to / "lib" / file.path().filename(),
+                                  std::filesystem::copy_options::copy_symlinks);
     std::filesystem::copy(from / "share", to / "share", std::filesystem::copy_options::recursive);
 }
 
@@ -41,7 +43,10 @@ std::map<std::string, std::optional<std::string>> Machine::environment() const {
         {"LC_ALL", "C"},
         {"VLM_LOG_TARGET", "none"},
         {"VLM_LOG_LEVEL", std::nullopt}};
-    for (const auto& [name, value] : cards.environment()) variables[name] = value;
+    for (const auto& entry : cards.environment()) {
+        const auto equals = entry.find('=');
+        variables[entry.substr(0, equals)] = entry.substr(equals + 1);
+    }
     return variables;
 }
 
@@ -52,10 +57,17 @@ void Machine::startService(const std::string& typedPin) {
     _service = std::make_unique<Child>(
         std::vector<std::string>{_folder.path() / "tree" / "bin" / "vlmhintsd", "--system",
                                  "--database", _folder.path() / "state" / "hints.sqlite3",
-                                 "--modules", cards.moduleDirectory(),
-                                 "--pinentry", VLM_ANSWERING_PINENTRY},
+                                 "--modules", cards.moduleDirectory(), "--pinentry",
+                                 VLM_ANSWERING_PINENTRY},
         options);
-    ASSERT_TRUE(_service->waitForErrors("ready")) << _service->errors();
+    const auto hasName = [this] {
+        return test::run({"dbus-send", "--bus=" + _bus.address(), "--print-reply=literal",
+                          "--dest=org.freedesktop.DBus", "/", "org.freedesktop.DBus.NameHasOwner",
+                          "string:org.vlm.token.hints.daemon"})
+                   .output.find("true") != std::string::npos;
+    };
+    for (int tries = 0; tries < 200 && !hasName(); ++tries) usleep(20'000);
+    ASSERT_TRUE(hasName()) << _service->errors();
 }
 
 void Machine::stopService() {
@@ -88,6 +100,16 @@ Ended Machine::run(std::vector<std::string> command, std::optional<uid_t> user,
     for (auto& [name, value] : variables) options.environment[name] = value;
 
     return test::run(std::move(command), options);
+}
+
+std::string Machine::listingOnceItShows(const std::string& text) {
+    std::string listing;
+    for (int tries = 0; tries < 100; ++tries) {
+        listing = vlmbind({"-i"}).output;
+        if (text.empty() ? listing.empty() : listing.find(text) != std::string::npos) break;
+        usleep(50'000);
+    }
+    return listing;
 }
 
 const std::string& Machine::serviceLog() { return _service->errors(); }

@@ -17,6 +17,8 @@
 
 namespace vlm::test {
 
+using tests::SoftCards;
+
 class Machine {
 public:
     Machine();
@@ -34,9 +36,12 @@ public:
     // with a whole command.
     Ended vlmbind(std::vector<std::string> arguments, std::optional<uid_t> user = std::nullopt,
                   std::map<std::string, std::optional<std::string>> environment = {});
-    Ended run(std::vector<std::string> command, std::vector<std::string> arguments,
-              std::optional<uid_t> user = std::nullopt,
+    Ended run(std::vector<std::string> command, std::optional<uid_t> user = std::nullopt,
               std::map<std::string, std::optional<std::string>> environment = {});
+
+    // The listing, once it holds the text, or is empty for an empty one; or the last one after some
+    // seconds. The service looks at software cards for news once a second.
+    std::string listingOnceItShows(const std::string& text);
 
     // What the service wrote to its log so far.
     const std::string& serviceLog();

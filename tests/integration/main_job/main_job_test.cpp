@@ -7,14 +7,16 @@
 
 namespace vlm::test {
 
+using tests::identity;
+
 using ::testing::HasSubstr;
 using ::testing::StartsWith;
 
 namespace {
 
 constexpr const char* kWarning =
-    "Failed to store Login keychain unlock key. Storing an unlock key is not possible yet in this "
-    "version.\n";
+    "Failed to store Login keychain unlock key. This version cannot store an "
+    "unlock key yet.\n";
 
 class MainJob : public ::testing::Test {
 protected:
@@ -34,7 +36,8 @@ TEST_F(MainJob, ListsPairsListsAndUnpairs) {
 
     const auto before = machine.vlmbind({"-i"});
     const std::string hash = firstHash(before.output);
-    EXPECT_EQ(before.output, "SmartCard: Card\nUnpaired identities:\n" + hash + "\tAlice Example\n");
+    EXPECT_EQ(before.output,
+              "SmartCard: Card\nUnpaired identities:\n" + hash + "\tAlice Example\n");
     EXPECT_EQ(before.status, 0);
 
     const auto paired = machine.vlmbind({"-p", "-u", "root", "-h", hash});
@@ -49,8 +52,7 @@ TEST_F(MainJob, ListsPairsListsAndUnpairs) {
                   "\troot - Alice Example\n");
 
     const auto unpaired = machine.vlmbind({"-r", "-v", "-u", "root", "-h", hash});
-    EXPECT_EQ(unpaired.output,
-              "User was successfully unpaired (public key hash: " + hash + ").\n");
+    EXPECT_EQ(unpaired.output, "User was successfully unpaired (public key hash: " + hash + ").\n");
     EXPECT_EQ(unpaired.status, 0);
 
     EXPECT_EQ(machine.vlmbind({"-i"}).output, before.output);
@@ -100,7 +102,10 @@ TEST_F(MainJob, ACardThatComesAndGoesIsListedWhileItIsIn) {
     EXPECT_EQ(machine.vlmbind({"-i"}).output, "");
 
     machine.cards.add("Card", {identity("p256", "Alice")});
-    EXPECT_THAT(machine.vlmbind({"-i"}).output, HasSubstr("Alice"));
+    EXPECT_THAT(machine.listingOnceItShows("Alice"), HasSubstr("Alice"));
+
+    machine.cards.remove("Card");
+    EXPECT_EQ(machine.listingOnceItShows(""), "");
 }
 
 TEST_F(MainJob, ANameFromACardCannotForgeALine) {

@@ -8,6 +8,8 @@
 
 namespace vlm::test {
 
+using tests::identity;
+
 using ::testing::HasSubstr;
 using ::testing::Not;
 
@@ -66,8 +68,7 @@ TEST_F(OrdinaryUser, CannotUnpairAndIsToldWhoCan) {
     const auto refused = vlmbind({"-r", "-u", "nobody", "-h", hash});
 
     EXPECT_EQ(refused.status, 255);
-    EXPECT_THAT(refused.output,
-                HasSubstr("Cannot unpair user (public key hash: " + hash + "). "));
+    EXPECT_THAT(refused.output, HasSubstr("Cannot unpair user (public key hash: " + hash + "). "));
     EXPECT_THAT(refused.output, HasSubstr("an administrator has to do this"));
     EXPECT_THAT(machine.vlmbind({"-i"}).output, HasSubstr("nobody - Alice Example"));
 }

@@ -8,6 +8,8 @@
 
 namespace vlm::test {
 
+using tests::identity;
+
 using ::testing::HasSubstr;
 using ::testing::StartsWith;
 
@@ -66,8 +68,7 @@ TEST_F(Refusals, AListingThatDoesNotFitOnTheDiskIsAFailure) {
     machine.cards.add("Card", {identity("p256", "Alice")});
     machine.startService();
 
-    const auto ended =
-        machine.run({"sh", "-c", "exec \"$0\" -i > /dev/full", machine.tool()});
+    const auto ended = machine.run({"sh", "-c", "exec \"$0\" -i > /dev/full", machine.tool()});
 
     EXPECT_EQ(ended.status, 255) << ended.errors;
     EXPECT_THAT(ended.errors, HasSubstr("Cannot write to standard output."));
@@ -143,8 +144,7 @@ TEST_F(PairingRefusals, AnExpiredIdentityIsNotOffered) {
 TEST_F(PairingRefusals, UnpairingWhatIsNotPairedSaysSo) {
     machine.startService();
 
-    const auto refused =
-        machine.vlmbind({"-r", "-u", "root", "-h", std::string(64, 'A')});
+    const auto refused = machine.vlmbind({"-r", "-u", "root", "-h", std::string(64, 'A')});
 
     EXPECT_EQ(refused.status, 255);
     EXPECT_THAT(refused.output, HasSubstr("not paired"));

@@ -6,7 +6,7 @@
 #include <unistd.h>
 
 #include <fstream>
-#include <regex>
+#include <sstream>
 
 #include "hints_machine.h"
 
@@ -23,15 +23,18 @@ std::string content(const std::filesystem::path& path) {
     return text;
 }
 
-// The installed activation file, for the program of the build tree.
+// The installed activation file, for the program of the build tree and a bus without a systemd.
 std::string activationFile(const std::string& name, const std::string& moreArguments) {
-    const auto installed =
-        content(std::filesystem::path(VLM_ACTIVATION_FILES) / (name + ".service"));
-    const auto forBuild =
-        std::regex_replace(installed, std::regex("Exec=\\S+ (--\\w+)"),
-                           std::string("Exec=") + VLM_HINTS_SERVICE + " $1" + moreArguments);
-    // The bus of a test has no systemd to ask.
-    return std::regex_replace(forBuild, std::regex("SystemdService=.*"), "");
+    std::istringstream installed(
+        content(std::filesystem::path(VLM_ACTIVATION_FILES) / (name + ".service")));
+    std::string adapted;
+    for (std::string line; std::getline(installed, line);) {
+        if (line.starts_with("SystemdService=")) continue;
+        if (line.starts_with("Exec="))
+            line = "Exec=" VLM_HINTS_SERVICE + line.substr(line.find(' ')) + moreArguments;
+        adapted += line + "\n";
+    }
+    return adapted;
 }
 
 Ended isPaired(const PrivateBus& bus, const char* name) {

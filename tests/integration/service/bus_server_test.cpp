@@ -192,6 +192,19 @@ TEST_F(BusServerTest, BoundsWhatOneUserMayHaveWaiting) {
     runUntil([&] { return exchanges.waiting.size() > BusServer::kMostWaitingOfOneUser; });
 }
 
+TEST_F(BusServerTest, CountsNoRequestWhoseAnswerWasGivenUp) {
+    for (int round = 0; round < 3; ++round) {
+        const auto caller = connect();
+        for (std::size_t sent = 0; sent < BusServer::kMostWaitingOfOneUser; ++sent)
+            send(caller.get(), 1);
+        runUntil([&] { return exchanges.waiting.size() == BusServer::kMostWaitingOfOneUser; });
+
+        exchanges.waiting.clear();
+    }
+
+    EXPECT_TRUE(replies.empty());
+}
+
 TEST_F(BusServerTest, NoticesThatACallerLeaves) {
     BusCallerWatch callers(serverBus.get());
     auto caller = connect();

@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <chrono>
-#include <regex>
 #include <thread>
 
 namespace vlm::test {
@@ -27,6 +26,14 @@ PrivateBus::Options sessionBusOptions() {
     return options;
 }
 
+// The text between the first `left` and the next `right`; nothing when there is none.
+std::string between(const std::string& text, const std::string& left, const std::string& right) {
+    const auto begin = text.find(left);
+    if (begin == std::string::npos) return {};
+    const auto end = text.find(right, begin + left.size());
+    return text.substr(begin + left.size(), end - begin - left.size());
+}
+
 }  // namespace
 
 // The build tree may lie where only its owner gets in, and some tests run its programs as another
@@ -42,10 +49,11 @@ void HintsMachine::insertCard(const std::string& name) {
     _cards.add("Card", {tests::identity("p256", name)});
     if (!_daemon) return;
     const auto list = call({"op=1", "uid=-1"});
-    std::smatch found;
-    if (std::regex_search(list, found, std::regex("<([0-9a-fA-F]{64})>"))) _hash = found[1];
-    if (std::regex_search(list, found, std::regex("pkcs11:[^\", )}]*"))) _token = found[0];
-    ASSERT_FALSE(_hash.empty() || _token.empty()) << list;
+    _hash = between(list, "<", ">");
+    _token = between(list, "\"pkcs11:", "\"");
+    ASSERT_EQ(_hash.size(), 64u) << list;
+    ASSERT_FALSE(_token.empty()) << list;
+    _token.insert(0, "pkcs11:");
 }
 
 std::vector<std::string> HintsMachine::daemonCommand(std::vector<std::string> moreArguments) const {

@@ -6,7 +6,7 @@
 
 #include <filesystem>
 #include <fstream>
-#include <regex>
+#include <sstream>
 
 #include "hints_machine.h"
 
@@ -59,12 +59,15 @@ protected:
     bool isRegistered() { return machine.agent().waitForErrors("through this instance"); }
     // Its name on the system bus.
     std::string connectionOfTheAgent() {
-        const auto list = run({"busctl", "--address=" + machine.systemBus().address(), "list",
-                               "--unique", "--no-legend"})
-                              .output;
-        std::smatch found;
-        const std::regex line("(:\\S+) +" + std::to_string(machine.agent().pid()) + " ");
-        return std::regex_search(list, found, line) ? found[1].str() : "(not in " + list + ")";
+        std::istringstream list(run({"busctl", "--address=" + machine.systemBus().address(), "list",
+                                     "--unique", "--no-legend"})
+                                    .output);
+        std::string name, pid;
+        for (std::string line; std::getline(list, line);) {
+            std::istringstream(line) >> name >> pid;
+            if (pid == std::to_string(machine.agent().pid())) return name;
+        }
+        return "(it is not on the bus)";
     }
     std::string note(const std::string& name) const {
         std::ifstream stream(machine.commonFolder() / name);

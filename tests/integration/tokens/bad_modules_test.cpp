@@ -1,8 +1,12 @@
 // Modules and workers that misbehave: the good cards are listed all the same.
 
 #include <gmock/gmock.h>
+#include <sys/prctl.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -153,6 +157,33 @@ TEST_F(BadModulesTest, AWorkerHasItsSocketAndStandardFilesOnlyAndMayGainNothing)
     const std::string said = text.str();
     // The last file is the folder that ls itself reads.
     EXPECT_EQ(said, "NoNewPrivs:\t1\n0\n/dev/null\n/dev/null\n0\n1\n2\n3\n4\n");
+}
+
+TEST_F(BadModulesTest, AWorkerThatHangsDiesWithTheProcessThatStartedIt) {
+    const std::filesystem::path hanging = cards.folder() / "hanging";
+    options.environment.push_back("VLM_TEST_HANGING=" + hanging.string());
+    configureOnly("hanging");
+    prctl(PR_SET_CHILD_SUBREAPER, 1);  // what the child leaves behind comes to this process
+    const pid_t child = fork();
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+        sd_event* loop = nullptr;  // a loop does not survive a fork
+        sd_event_new(&loop);
+        service::WorkerTokens childTokens(loop, options);
+        childTokens.list([](const std::vector<Token>&) {});
+        while (sd_event_run(loop, UINT64_MAX) >= 0) continue;
+        _exit(1);
+    }
+    while (!std::filesystem::exists(hanging) && waitpid(child, nullptr, WNOHANG) == 0) usleep(1000);
+    ASSERT_TRUE(std::filesystem::exists(hanging));
+
+    kill(child, SIGKILL);
+
+    ASSERT_EQ(waitpid(child, nullptr, 0), child);
+    int status = 0;
+    EXPECT_GT(waitpid(-1, &status, 0), 0) << "the worker was not this process's to wait for";
+    EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL);
+    prctl(PR_SET_CHILD_SUBREAPER, 0);
 }
 
 }  // namespace

@@ -187,6 +187,7 @@ TEST_F(ProofTest, OutOfBoundsIsRefusedAndHarmsNothing) {
 
     EXPECT_EQ(prove(token, token.identities[0], std::string(257, '1')).outcome,
               Outcome::CardFailed);
+    EXPECT_THAT(warnings(), IsEmpty());
 
     expectValid(token.identities[0], prove(token, token.identities[0], SoftCards::kPin));
 }

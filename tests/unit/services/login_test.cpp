@@ -141,7 +141,7 @@ TEST_F(LoginTest, PassesOnThatTheNextTryIsTheLast) {
 TEST_F(LoginTest, TriesAWrongPinOnceAndTellsHowManyTriesAreLeft) {
     insertCard();
 
-    const char* const left[] = {"few tries are left", "one try is left", "no try is left"};
+    const char* const left[] = {"a few tries are left", "one try is left", "no try is left"};
     for (std::size_t tried = 0; tried < 3; ++tried) {
         const auto reply = ask(alice(), loginWithPin(1, "000000"));
 

@@ -18,7 +18,6 @@ protected:
     }
 };
 
-constexpr Caller kRoot{0, 1, ":1.1"};
 constexpr platform::UserId kAlice = 1000;
 
 Request about(Operation operation, const std::string& account, platform::UserId user) {
@@ -66,12 +65,13 @@ constexpr Rule kRules[] = {
 };
 
 TEST_F(PermissionTest, LetsRootDoAllAndOthersAskAboutThemselves) {
+    const Caller root{0, 1, ":1.1"};
     const Caller alice{kAlice, 2, ":1.2"};
     for (const auto& rule : kRules) {
         SCOPED_TRACE(rule.why);
         const auto request = about(rule.operation, rule.account, rule.user);
 
-        EXPECT_FALSE(refusalFor(kRoot, request));
+        EXPECT_FALSE(refusalFor(root, request));
         const auto refusal = refusalFor(alice, request);
         EXPECT_EQ(!refusal, rule.aliceMay);
         EXPECT_EQ(refusal ? refusal->status : 0, rule.aliceMay ? 0 : status::kNotPermitted);
