@@ -12,8 +12,8 @@ constexpr char32_t kReplacement = 0xFFFD;
 char32_t takeCharacter(std::string_view& text) {
     const auto byteAt = [&text](std::size_t i) { return static_cast<std::uint8_t>(text[i]); };
     const std::uint8_t first = byteAt(0);
-    const std::size_t size = first < 0x80 ? 1 : first < 0xE0 ? 2 : first < 0xF0 ? 3 : 4;
-    if (first < 0x80 || first < 0xC2 || first > 0xF4) {
+    const std::size_t size = first < 0xE0 ? 2 : first < 0xF0 ? 3 : 4;
+    if (first < 0xC2 || first > 0xF4) {  // not the first of several
         text.remove_prefix(1);
         return first < 0x80 ? first : kReplacement;
     }

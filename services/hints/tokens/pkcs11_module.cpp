@@ -3,7 +3,7 @@
 #include <p11-kit/p11-kit.h>
 
 #include <algorithm>
-#include <cstdio>
+#include <sstream>
 #include <utility>
 
 #include "platform/text.h"
@@ -20,9 +20,9 @@ std::string field(const CK_UTF8CHAR (&padded)[size]) {
 }  // namespace
 
 std::string resultText(CK_RV result) {
-    char number[24];
-    std::snprintf(number, sizeof number, "0x%lx", result);
-    return platform::text("{} ({})", harmlessText(p11_kit_strerror(result)), number);
+    std::ostringstream number;
+    number << std::hex << std::showbase << result;
+    return platform::text("{} ({})", harmlessText(p11_kit_strerror(result)), number.str());
 }
 
 std::unique_ptr<Pkcs11Module> Pkcs11Module::load(const std::string& path, std::string* reason) {

@@ -4,6 +4,7 @@
 
 #include <string>
 #include <string_view>
+#include <tuple>
 
 namespace vlm::service {
 
@@ -14,7 +15,10 @@ struct TokenFields {
     std::string serial;
     std::string label;
 
-    auto operator<=>(const TokenFields&) const = default;
+    bool operator<(const TokenFields& other) const {
+        return std::tie(model, manufacturer, serial, label) <
+               std::tie(other.model, other.manufacturer, other.serial, other.label);
+    }
 };
 
 // Spelled to the byte as p11-kit spells it, so that an identifier can be given to its tools.

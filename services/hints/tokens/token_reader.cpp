@@ -57,10 +57,11 @@ std::optional<KeyObject> readKey(const Pkcs11Session& session, CK_OBJECT_HANDLE 
         session.read(object, {CKA_KEY_TYPE, CKA_ID, CKA_MODULUS, CKA_EC_POINT, CKA_SIGN, CKA_VERIFY,
                               CKA_DECRYPT, CKA_UNWRAP, CKA_ENCRYPT, CKA_WRAP, CKA_DERIVE});
     const auto type = attributes.number(CKA_KEY_TYPE);
-    if (type != CK_ULONG{CKK_RSA} && type != CK_ULONG{CKK_EC}) return {};
+    const bool rsa = type == CK_ULONG{CKK_RSA};
+    const bool ec = type == CK_ULONG{CKK_EC};
+    if (!rsa && !ec) return {};
 
     KeyObject key;
-    const bool rsa = *type == CKK_RSA;
     key.isPrivate = isPrivate;
     key.kind = rsa ? KeyKind::Rsa : KeyKind::Ec;
     key.id = attributes.bytes(CKA_ID).value_or(Bytes{});

@@ -8,8 +8,8 @@
 #include <unistd.h>
 
 #include <charconv>
-#include <cstdio>
 #include <ctime>
+#include <iostream>
 #include <string>
 
 #include "services/hints/tokens/card_module.h"
@@ -84,7 +84,7 @@ int run(int argc, char* argv[]) {
     struct stat status = {};
     if (number.empty() || std::from_chars(number.data(), end, milliseconds).ptr != end ||
         fstat(kSocket, &status) != 0 || !S_ISSOCK(status.st_mode)) {
-        std::fputs("vlm-token-worker: it is started by the hints service, not by hand\n", stderr);
+        std::cerr << "vlm-token-worker: it is started by the hints service, not by hand\n";
         return 2;
     }
     closeToOthers();
@@ -101,6 +101,5 @@ int run(int argc, char* argv[]) {
 int main(int argc, char* argv[]) {
     const int status = vlm::service::run(argc, argv);
     // The module's own clean-up at exit is not waited for: some crash in it.
-    std::fflush(nullptr);
     _exit(status);
 }

@@ -22,6 +22,7 @@ constexpr int kWorkerSocket = 3;
 
 std::vector<char*> pointersTo(const std::vector<std::string>& texts) {
     std::vector<char*> pointers;
+    pointers.reserve(texts.size() + 1);
     // execve() only reads them; its parameters are older than const.
     for (const std::string& text : texts) pointers.push_back(const_cast<char*>(text.c_str()));
     pointers.push_back(nullptr);
@@ -52,7 +53,7 @@ std::vector<std::string> environmentWith(const std::vector<std::string>& first) 
     sigset_t nothing;
     sigemptyset(&nothing);
     sigprocmask(SIG_SETMASK, &nothing, nullptr);
-    signal(SIGPIPE, SIG_DFL);
+    static_cast<void>(signal(SIGPIPE, SIG_DFL));
 
     if (socket == kWorkerSocket)
         fcntl(socket, F_SETFD, 0);

@@ -1,8 +1,6 @@
 // soft-card: makes software cards in the token store that SOFTHSM2_CONF names, from a description
 // in its arguments or, without any, on standard input.
 
-#include <cstdio>
-#include <fstream>
 #include <iostream>
 #include <string>
 #include <vector>
@@ -18,16 +16,15 @@ int main(int argc, char* argv[]) {
     std::string reason;
     const auto cards = vlm::tests::readCards(words, &reason);
     if (!cards || cards->empty()) {
-        std::fprintf(stderr, "soft-card: %s\n",
-                     cards
-                         ? "usage: soft-card token label=NAME pin=PIN identity key=KIND cn=NAME ..."
-                         : reason.c_str());
+        if (cards)
+            reason = "usage: soft-card token label=NAME pin=PIN identity key=KIND cn=NAME ...";
+        std::cerr << "soft-card: " << reason << "\n";
         return 2;
     }
     vlm::tests::SoftTokenStore store(VLM_SOFTHSM_MODULE);
     for (const auto& card : *cards) {
         if (const auto failure = store.write(card)) {
-            std::fprintf(stderr, "soft-card: %s\n", failure->c_str());
+            std::cerr << "soft-card: " << *failure << "\n";
             return 1;
         }
     }

@@ -13,7 +13,7 @@ namespace vlm::tests {
 namespace {
 
 struct FileClose {
-    void operator()(std::FILE* file) const { std::fclose(file); }
+    void operator()(std::FILE* file) const { static_cast<void>(std::fclose(file)); }
 };
 using File = std::unique_ptr<std::FILE, FileClose>;
 
@@ -21,7 +21,8 @@ using File = std::unique_ptr<std::FILE, FileClose>;
 File fileWith(const std::string& content) {
     File file(std::tmpfile());
     if (!file) return file;
-    std::fwrite(content.data(), 1, content.size(), file.get());
+    if (std::fwrite(content.data(), 1, content.size(), file.get()) != content.size())
+        return nullptr;
     std::rewind(file.get());
     return file;
 }
@@ -37,6 +38,7 @@ std::string contentOf(const File& file) {
 
 std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     std::vector<char*> pointers;
+    pointers.reserve(texts.size() + 1);
     for (std::string& text : texts) pointers.push_back(text.data());
     pointers.push_back(nullptr);
     return pointers;

@@ -3,7 +3,8 @@
 #include <openssl/core_names.h>
 #include <p11-kit/p11-kit.h>
 
-#include <cstdio>
+#include <iomanip>
+#include <sstream>
 #include <stdexcept>
 #include <vector>
 
@@ -18,9 +19,9 @@ class Failure : public std::runtime_error {
 
 void check(CK_RV result, const char* what) {
     if (result == CKR_OK) return;
-    char text[128];
-    std::snprintf(text, sizeof text, "%s: error 0x%lx", what, result);
-    throw Failure(text);
+    std::ostringstream text;
+    text << what << ": error " << std::hex << std::showbase << result;
+    throw Failure(text.str());
 }
 
 // An object to be made: attributes with the values that they point to.
@@ -190,9 +191,9 @@ std::optional<std::string> SoftTokenStore::write(const Card& card) {
         for (CardIdentity identity : card.identities) {
             ++number;
             if (identity.id.empty()) {
-                char id[16];
-                std::snprintf(id, sizeof id, "%04x", number);
-                identity.id = id;
+                std::ostringstream id;
+                id << std::hex << std::setfill('0') << std::setw(4) << number;
+                identity.id = id.str();
             }
             writeIdentity(_module, session, identity);
         }
