@@ -84,13 +84,10 @@ public:
         if (!isThere("dat1")) return {};
         const auto* bytes = message().bytes("dat1");
         if (!bytes) return missing("dat1", "bytes"), std::string();
-        if (bytes->size() > kMostQuery)
-            return refuse(platform::text("\"dat1\" has {} bytes, and {} is the most", bytes->size(),
-                                         kMostQuery)),
-                   std::string();
         const auto list = platform::readPropertyList(*bytes, kQueryLimits);
         const auto* query = list ? list->dictionary() : nullptr;
-        if (!query) return refuse("\"dat1\" is no dictionary in a property list"), std::string();
+        if (!query)
+            return refuse("\"dat1\" is no small dictionary in a property list"), std::string();
         const auto* token = query->find("tokid");
         if (!token) return {};
         if (!token->text() || token->text()->empty() ||

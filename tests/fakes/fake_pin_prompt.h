@@ -29,6 +29,7 @@ public:
     // What happened.
     std::vector<service::PinQuestion> questions;
     std::size_t open() const { return _open.size(); }
+    int held = 0;  // questions that the asking side has not let go of
 
     std::unique_ptr<Question> ask(const service::PinQuestion& question, Answer answer) override {
         questions.push_back(question);
@@ -41,10 +42,15 @@ private:
     class FakeQuestion final : public Question {
     public:
         FakeQuestion(FakePinPrompt& prompt, Answer answer)
-            : _prompt(prompt), _answer(std::move(answer)) {}
+            : _prompt(prompt), _answer(std::move(answer)) {
+            ++_prompt.held;
+        }
         FakeQuestion(const FakeQuestion&) = delete;
         FakeQuestion& operator=(const FakeQuestion&) = delete;
-        ~FakeQuestion() override { std::erase(_prompt._open, this); }
+        ~FakeQuestion() override {
+            std::erase(_prompt._open, this);
+            --_prompt.held;
+        }
 
         Answer takeAnswer() { return std::exchange(_answer, nullptr); }
 

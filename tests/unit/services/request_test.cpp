@@ -96,8 +96,11 @@ std::vector<Hostile> hostileRequests() {
     const std::string long2049(2049, 'x');
     const PropertyList numberedToken = PropertyList::Dictionary{{"tokid", 7}};
     const PropertyList emptyToken = PropertyList::Dictionary{{"tokid", ""}};
+    const PropertyList large =
+        PropertyList::Dictionary{{"tokid", "t"}, {"more", Bytes(std::size_t{64} << 10U)}};
     PropertyList deep = 1;
     for (int level = 0; level < 20; ++level) deep = PropertyList::Array{deep};
+    deep = PropertyList::Dictionary{{"tokid", "t"}, {"more", deep}};
     return {
         {"no operation", {}, "\"op\""},
         {"an operation that does not exist", requestOf(8), "\"op\""},
@@ -152,7 +155,7 @@ std::vector<Hostile> hostileRequests() {
         {"a query that is no dictionary", requestOf(1, {{"dat1", query(1)}, {"uid", uid}}),
          "\"dat1\""},
         {"a query that is deep", requestOf(1, {{"dat1", query(deep)}, {"uid", uid}}), "\"dat1\""},
-        {"a query that is large", requestOf(1, {{"dat1", Bytes(65537)}, {"uid", uid}}), "\"dat1\""},
+        {"a query that is large", requestOf(1, {{"dat1", query(large)}, {"uid", uid}}), "\"dat1\""},
         {"a query for a number", requestOf(1, {{"dat1", query(numberedToken)}, {"uid", uid}}),
          "\"tokid\""},
         {"a query for no token", requestOf(1, {{"dat1", query(emptyToken)}, {"uid", uid}}),
