@@ -10,6 +10,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <ostream>
 #include <sstream>
 
 #include "tests/integration/tokens/tokens_test.h"
@@ -109,6 +110,9 @@ struct BadWorker {
     const char* commands;
     const char* warning;
 };
+
+// What the test is listed as.
+void PrintTo(const BadWorker& worker, std::ostream* stream) { *stream << worker.why; }
 
 class BadWorkerTest : public BadModulesTest, public testing::WithParamInterface<BadWorker> {};
 
