@@ -129,9 +129,9 @@ INSTANTIATE_TEST_SUITE_P(
     All, BadWorkerTest,
     testing::Values(BadWorker{"a program that ends", "exit 0", "crashed or ended"},
                     BadWorker{"a length that is out of bounds",
-                              "printf '\\377\\377\\377\\377' >&3; sleep 60", "too long"},
+                              "printf '\\377\\377\\377\\377' >&3; exec sleep 60", "too long"},
                     BadWorker{"a frame that is no list",
-                              "printf '\\003\\000\\000\\000abc' >&3; sleep 60", "makes no sense"},
+                              "printf '\\003\\000\\000\\000abc' >&3; exec sleep 60", "makes no sense"},
                     BadWorker{"half a frame", "printf '\\003\\000\\000\\000a' >&3",
                               "crashed or ended"}));
 
