@@ -127,13 +127,13 @@ TEST_P(BadWorkerTest, IsEndedAndItsCardsAreNotListed) {
 
 INSTANTIATE_TEST_SUITE_P(
     All, BadWorkerTest,
-    testing::Values(BadWorker{"a program that ends", "exit 0", "crashed or ended"},
-                    BadWorker{"a length that is out of bounds",
-                              "printf '\\377\\377\\377\\377' >&3; exec sleep 60", "too long"},
-                    BadWorker{"a frame that is no list",
-                              "printf '\\003\\000\\000\\000abc' >&3; exec sleep 60", "makes no sense"},
-                    BadWorker{"half a frame", "printf '\\003\\000\\000\\000a' >&3",
-                              "crashed or ended"}));
+    testing::Values(
+        BadWorker{"a program that ends", "exit 0", "crashed or ended"},
+        BadWorker{"a length that is out of bounds",
+                  "printf '\\377\\377\\377\\377' >&3; exec sleep 60", "too long"},
+        BadWorker{"a frame that is no list", "printf '\\003\\000\\000\\000abc' >&3; exec sleep 60",
+                  "makes no sense"},
+        BadWorker{"half a frame", "printf '\\003\\000\\000\\000a' >&3", "crashed or ended"}));
 
 TEST_F(BadModulesTest, AWorkerProgramThatIsMissingIsAWarning) {
     options.workerProgram = cards.folder() / "nothing";
