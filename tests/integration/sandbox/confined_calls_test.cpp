@@ -70,7 +70,8 @@ TEST_F(ConfinedCallsTest, AUnixServerCanBeTalkedTo) {
     ASSERT_EQ(send(peer.get(), "pong", 4, MSG_NOSIGNAL), 4);
 
     EXPECT_EQ(client.wait(), 0);
-    EXPECT_EQ(client.output(), "result: 0\n");
+    // Where a part of the confinement is missing, a log line comes first.
+    EXPECT_TRUE(client.output().ends_with("result: 0\n")) << client.output();
 }
 
 TEST_F(ConfinedCallsTest, CallsThatAToolHasNoUseForAreRefused) {
