@@ -16,6 +16,8 @@ class ConsoleSessions;
 class Keychain;
 class Localization;
 class NamedServiceIpc;
+class Notifications;
+class Preferences;
 class ProcessInfo;
 class Sandbox;
 class SystemLog;
@@ -27,6 +29,8 @@ public:
     Keychain& keychain();
     Localization& localization();
     NamedServiceIpc& namedServiceIpc();
+    Notifications& notifications();
+    Preferences& preferences();
     ProcessInfo& processInfo();
     Sandbox& sandbox();
     SystemLog& systemLog();

@@ -117,8 +117,26 @@ struct PropertyListLimits {
 VLM_EXPORT std::optional<PropertyList> readPropertyList(std::span<const std::uint8_t> data,
                                                         const PropertyListLimits& limits = {});
 
+enum class PropertyListFormat { Binary, Xml, Text };
+
+// Reads like readPropertyList(), and tells a person what is wrong where.
+struct PropertyListExamination {
+    PropertyListFormat format = PropertyListFormat::Text;  // what the data looks like
+    std::optional<PropertyList> value;
+    std::string problem;     // a sentence; empty when there is a value
+    std::size_t line = 0;    // of the problem, counted from 1; 0 in a binary list
+    std::size_t column = 0;  // in characters, counted from 1; 0 likewise
+};
+PropertyListExamination examinePropertyList(std::span<const std::uint8_t> data,
+                                            const PropertyListLimits& limits = {});
+
 // Writes the binary format 1.0; the same value always gives the same bytes.
 VLM_EXPORT std::optional<Bytes> writeBinaryPropertyList(const PropertyList& value,
                                                         const PropertyListLimits& limits = {});
+
+// Writes XML, with line breaks and indents for people. None also for a value that XML has no form
+// for: text with control characters, a date that is no whole second of the years 1 to 9999.
+std::optional<std::string> writeXmlPropertyList(const PropertyList& value,
+                                                const PropertyListLimits& limits = {});
 
 }  // namespace vlm::platform

@@ -26,6 +26,8 @@ ConsoleSessions& Platform::consoleSessions() { return *fakes::installed->console
 Keychain& Platform::keychain() { return *fakes::installed->keychain; }
 Localization& Platform::localization() { return *fakes::installed->localization; }
 NamedServiceIpc& Platform::namedServiceIpc() { return *fakes::installed->namedServiceIpc; }
+Notifications& Platform::notifications() { return *fakes::installed->notifications; }
+Preferences& Platform::preferences() { return *fakes::installed->preferences; }
 ProcessInfo& Platform::processInfo() { return *fakes::installed->processInfo; }
 Sandbox& Platform::sandbox() { return *fakes::installed->sandbox; }
 SystemLog& Platform::systemLog() { return *fakes::installed->systemLog; }

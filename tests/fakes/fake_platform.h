@@ -8,6 +8,8 @@
 #include "fake_keychain.h"
 #include "fake_localization.h"
 #include "fake_named_service_ipc.h"
+#include "fake_notifications.h"
+#include "fake_preferences.h"
 #include "fake_process_info.h"
 #include "fake_sandbox.h"
 #include "recording_system_log.h"
@@ -27,6 +29,8 @@ public:
     FakeKeychain fakeKeychain;
     FakeLocalization fakeLocalization;
     FakeNamedServiceIpc fakeNamedServiceIpc;
+    FakeNotifications fakeNotifications;
+    FakePreferences fakePreferences;
     FakeProcessInfo fakeProcessInfo;
     FakeSandbox fakeSandbox;
     RecordingSystemLog recordingSystemLog;
@@ -37,6 +41,8 @@ public:
     platform::Keychain* keychain = &fakeKeychain;
     platform::Localization* localization = &fakeLocalization;
     platform::NamedServiceIpc* namedServiceIpc = &fakeNamedServiceIpc;
+    platform::Notifications* notifications = &fakeNotifications;
+    platform::Preferences* preferences = &fakePreferences;
     platform::ProcessInfo* processInfo = &fakeProcessInfo;
     platform::Sandbox* sandbox = &fakeSandbox;
     platform::SystemLog* systemLog = &recordingSystemLog;

@@ -19,6 +19,8 @@ protected:
     FakeKeychain& keychain() { return _platform.fakeKeychain; }
     FakeLocalization& localization() { return _platform.fakeLocalization; }
     FakeNamedServiceIpc& ipc() { return _platform.fakeNamedServiceIpc; }
+    FakeNotifications& notifications() { return _platform.fakeNotifications; }
+    FakePreferences& preferences() { return _platform.fakePreferences; }
     FakeProcessInfo& process() { return _platform.fakeProcessInfo; }
     FakeSandbox& sandbox() { return _platform.fakeSandbox; }
     RecordingSystemLog& log() { return _platform.recordingSystemLog; }
