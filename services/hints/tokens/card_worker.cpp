@@ -1,5 +1,6 @@
 #include "services/hints/tokens/card_worker.h"
 
+#include <poll.h>
 #include <sys/socket.h>
 
 #include <algorithm>
@@ -13,6 +14,14 @@ namespace vlm::service {
 namespace {
 
 constexpr platform::Log kLog("org.vlm.token", "hints");
+
+// Seen by the next read, or by a request that is sent before it.
+constexpr const char* kEnded = "crashed or ended";
+
+bool hasHungUp(int socket) {
+    pollfd state{.fd = socket, .events = 0, .revents = 0};
+    return poll(&state, 1, 0) == 1 && (state.revents & POLLHUP) != 0;
+}
 
 }  // namespace
 
@@ -70,7 +79,8 @@ void CardWorker::startNext() {
     _current->limit = callAfter(_event, limitOf(*_current),
                                 [this] { fail("did not answer in time and was ended"); });
     if (!ensureProcess()) return fail("has no process to run in");
-    if (!send(*_current)) fail("does not take requests");
+    if (!send(*_current))
+        fail(hasHungUp(_process->socket.get()) ? kEnded : "does not take requests");
 }
 
 bool CardWorker::send(Job& job) {
@@ -98,7 +108,7 @@ void CardWorker::receive() {
     std::array<std::uint8_t, 64UL * 1024> piece;
     const ssize_t size = recv(_process->socket.get(), piece.data(), piece.size(), MSG_DONTWAIT);
     if (size < 0 && (errno == EAGAIN || errno == EINTR)) return;
-    if (size <= 0) return fail("crashed or ended");
+    if (size <= 0) return fail(kEnded);
     if (!_current) return fail("spoke without being asked");
     switch (_incoming.add(std::span(piece).first(static_cast<std::size_t>(size)))) {
         case FrameAssembler::State::Incomplete:
