@@ -2,16 +2,18 @@
 
 namespace vlm::platform {
 
-std::string toText(const Bytes& bytes) {
+std::string hexadecimal(const Bytes& bytes) {
     constexpr std::string_view kDigits = "0123456789ABCDEF";
-    std::string text = "<";
-    text.reserve(bytes.size() * 2 + 2);
+    std::string text;
+    text.reserve(bytes.size() * 2);
     for (const std::uint8_t byte : bytes) {
         text += kDigits[byte >> 4U];
         text += kDigits[byte & 0xFU];
     }
-    return text + ">";
+    return text;
 }
+
+std::string toText(const Bytes& bytes) { return "<" + hexadecimal(bytes) + ">"; }
 
 std::string toText(const Error& error) {
     std::string text = error.domain + " error " + std::to_string(error.code);

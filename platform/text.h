@@ -21,6 +21,9 @@
 
 namespace vlm::platform {
 
+// Two upper-case digits a byte with nothing between them.
+std::string hexadecimal(const Bytes& bytes);
+
 std::string toText(const Bytes& bytes);
 std::string toText(const Error& error);
 inline std::string toText(std::string_view text) { return std::string(text); }

@@ -7,9 +7,9 @@
 
 #include "bind/bind_operation.h"
 #include "bind/token_info.h"
+#include "platform/harmless_text.h"
 #include "platform/text.h"
 #include "tool/exit_status.h"
-#include "tool/harmless_text.h"
 #include "util/bind_utils.h"
 
 namespace vlm {
@@ -39,6 +39,11 @@ AccountByHash accountsByHash(const TokenInfo& info) {
     return accounts;
 }
 
+// The listing may be read by programs, which want names whole.
+std::string shownWhole(std::string_view name) {
+    return platform::harmlessText(name, platform::kAllCharacters);
+}
+
 // A key is listed once, in the first group that it belongs to.
 Groups groupsOf(const std::vector<Bytes>& hashes, const TokenInfo& info,
                 const AccountByHash& accounts) {
@@ -47,11 +52,11 @@ Groups groupsOf(const std::vector<Bytes>& hashes, const TokenInfo& info,
         const std::string hex = *BindUtils::dataToHex(hash);
         const auto name = lookUp(info.names, hash);
         if (const auto account = lookUp(accounts, hash))
-            groups.used[hex] = harmlessText(text("{} - {}", *account, name));
+            groups.used[hex] = shownWhole(text("{} - {}", *account, name));
         else if (const auto shown = lookUp(info.bound, hash))
-            groups.notUsed[hex] = harmlessText(text("{} - {}", *shown, name));
+            groups.notUsed[hex] = shownWhole(text("{} - {}", *shown, name));
         else if (const auto offered = lookUp(info.offered, hash))
-            groups.unpaired[hex] = harmlessText(*offered);
+            groups.unpaired[hex] = shownWhole(*offered);
     }
     return groups;
 }
@@ -90,7 +95,7 @@ int listIdentities(Console& console) {
     const auto accounts = accountsByHash(info);
     bool first = true;
     for (const auto& token : info.tokens) {
-        const std::string name = harmlessText(text("{}", lookUp(info.cardNames, token)));
+        const std::string name = shownWhole(text("{}", lookUp(info.cardNames, token)));
         console.print(text("{}SmartCard: {}", std::exchange(first, false) ? "" : "\n", name));
         const auto hashes = info.hashesByToken.find(token);
         if (hashes != info.hashesByToken.end())

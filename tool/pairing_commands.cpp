@@ -2,16 +2,17 @@
 
 #include "bind/bind_operation.h"
 #include "hints/hints_client.h"
+#include "platform/harmless_text.h"
 #include "platform/text.h"
 #include "platform/token_framework.h"
 #include "settings/smartcard_settings.h"
 #include "tool/exit_status.h"
-#include "tool/harmless_text.h"
 #include "util/bind_utils.h"
 
 namespace vlm {
 
 using platform::Error;
+using platform::harmlessText;
 using platform::kSuccess;
 using platform::Status;
 using platform::text;

@@ -9,6 +9,7 @@
 #include "platform/console_sessions.h"
 #include "platform/platform.h"
 #include "platform/process_info.h"
+#include "platform/text.h"
 #include "platform/token_framework.h"
 #include "platform/utf.h"
 
@@ -18,8 +19,6 @@ using platform::Bytes;
 using platform::UserId;
 
 namespace {
-
-constexpr std::string_view kDigits = "0123456789ABCDEF";
 
 // The text's UTF-16 units without the spaces, each cut down to its low eight bits.
 std::optional<Bytes> lowBytesWithoutSpaces(const std::string& text) {
@@ -89,13 +88,7 @@ std::string BindUtils::processOwnerUserName() {
 
 std::optional<std::string> BindUtils::dataToHex(const std::optional<Bytes>& data) {
     if (!data) return std::nullopt;
-    std::string text;
-    text.reserve(data->size() * 2);
-    for (const std::uint8_t byte : *data) {
-        text += kDigits[byte >> 4U];
-        text += kDigits[byte & 0xFU];
-    }
-    return text;
+    return platform::hexadecimal(*data);
 }
 
 std::optional<Bytes> BindUtils::dataFromHex(const std::optional<std::string>& text) {

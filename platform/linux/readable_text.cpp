@@ -1,15 +1,11 @@
 #include "platform/linux/readable_text.h"
 
+#include "platform/harmless_text.h"
 #include "platform/utf.h"
 
 namespace vlm::platform {
 
 namespace {
-
-bool isControl(char32_t character) {
-    return character < 0x20 || (character >= 0x7F && character < 0xA0) || character == 0x2028 ||
-           character == 0x2029;
-}
 
 std::string escaped(char32_t character) {
     if (character == '\n') return "\\n";
@@ -29,9 +25,10 @@ std::string readable(std::string_view text, std::size_t mostBytes) {
     while (!text.empty()) {
         const TextPiece piece = firstOfUtf8(text);
         const char32_t character = piece.character.value_or(kReplacement);
-        const std::string next =
-            isControl(character) ? escaped(character) : std::string(encodeUtf8(character).view());
-        if (line.size() + next.size() > mostBytes) return line + "...";
+        const std::string next = actsInsteadOfShowing(character)
+                                     ? escaped(character)
+                                     : std::string(encodeUtf8(character).view());
+        if (line.size() + next.size() > mostBytes) return line.append(kCutMark);
         line += next;
         text.remove_prefix(piece.units);
     }

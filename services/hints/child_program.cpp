@@ -15,8 +15,8 @@
 #include <cstring>
 #include <utility>
 
+#include "platform/harmless_text.h"
 #include "platform/text.h"
-#include "services/hints/shown_text.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
@@ -74,8 +74,9 @@ void takeStreams(int socket) {
 }
 
 Refusal failed(const ProgramToRun& program, int error) {
-    return {status::kNoPin, platform::text("the program {} cannot be run ({})",
-                                           shownText(program.path), std::strerror(error))};
+    return {status::kNoPin,
+            platform::text("the program {} cannot be run ({})",
+                           platform::harmlessText(program.path), std::strerror(error))};
 }
 
 }  // namespace

@@ -5,13 +5,13 @@
 #include <utility>
 
 #include "platform/accounts.h"
+#include "platform/harmless_text.h"
 #include "platform/platform.h"
 #include "platform/text.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/permission.h"
 #include "services/hints/reply.h"
 #include "services/hints/request.h"
-#include "services/hints/shown_text.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
@@ -136,8 +136,8 @@ Outcome<Message> HintsService::pair(const Caller& caller, const Request& request
     if (const auto failure = _parts.pairings.pair(*account, request.hash, _parts.now()))
         return *failure;
     _proofs.useUp(caller.user, request.hash);
-    kLog.notice("paired {} with {} for user {}", shownText(*account), shownHash(request.hash),
-                caller.user);
+    kLog.notice("paired {} with {} for user {}", platform::harmlessText(*account),
+                platform::hexadecimal(request.hash), caller.user);
     return numberReply(status::kSuccess);
 }
 
@@ -149,8 +149,8 @@ Outcome<Message> HintsService::unpair(const Caller& caller, const Request& reque
         wasThere = _parts.pairings.unpair(request.account, request.hash);
     if (!wasThere) return wasThere.refusal();
     if (!*wasThere) return refused(status::kNotPaired, request, "they are not paired.");
-    kLog.notice("unpaired {} from {} for user {}", shownText(account), shownHash(request.hash),
-                caller.user);
+    kLog.notice("unpaired {} from {} for user {}", platform::harmlessText(account),
+                platform::hexadecimal(request.hash), caller.user);
     return numberReply(status::kSuccess);
 }
 

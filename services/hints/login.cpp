@@ -3,8 +3,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "platform/harmless_text.h"
 #include "platform/text.h"
-#include "services/hints/shown_text.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
@@ -82,7 +82,7 @@ void Login::takePin(PinAnswer answer) {
         case PinAnswer::Outcome::Unavailable:
             return refuse(status::kNoPin,
                           platform::text("nobody could be asked for the PIN, because {}.",
-                                         shownText(answer.reason, 512)));
+                                         platform::harmlessText(answer.reason, 512)));
     }
 }
 
@@ -117,8 +117,9 @@ void Login::judge(const Proof& proof) {
         case Proof::Outcome::Cancelled:
             return refuse(status::kCancelled, "it was cancelled at the card reader.");
         case Proof::Outcome::CardFailed:
-            return refuse(status::kCardFailed,
-                          platform::text("the card failed: {}.", shownText(proof.reason, 512)));
+            return refuse(
+                status::kCardFailed,
+                platform::text("the card failed: {}.", platform::harmlessText(proof.reason, 512)));
     }
     if (!_parts.verify(_identity.publicKeyInfo, _identity.publicKeyHash, _challenge,
                        proof.signature))

@@ -3,8 +3,8 @@
 #include <charconv>
 #include <utility>
 
+#include "platform/harmless_text.h"
 #include "platform/text.h"
-#include "services/hints/shown_text.h"
 
 namespace vlm::service {
 
@@ -51,8 +51,8 @@ std::string description(const PinQuestion& question) {
     return platform::text(
         "Enter the PIN of the card \"{}\". The card then proves that it holds the identity "
         "\"{}\".{}",
-        shownText(question.card, kMostNameCharacters),
-        shownText(question.identity, kMostNameCharacters), warning(question.state));
+        platform::harmlessText(question.card, kMostNameCharacters),
+        platform::harmlessText(question.identity, kMostNameCharacters), warning(question.state));
 }
 
 // One word of a line, taken off its head.
@@ -159,7 +159,7 @@ void PinentryDialog::endWithError(std::string_view error) {
             return end(PinAnswer::Outcome::TimedOut);
         default:
             end(PinAnswer::Outcome::Unavailable,
-                platform::text("the pinentry program failed: {}", shownText(error)));
+                platform::text("the pinentry program failed: {}", platform::harmlessText(error)));
     }
 }
 

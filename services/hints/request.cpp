@@ -4,9 +4,9 @@
 #include <limits>
 #include <utility>
 
+#include "platform/harmless_text.h"
 #include "platform/property_list.h"
 #include "platform/text.h"
-#include "services/hints/shown_text.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
@@ -175,12 +175,12 @@ Outcome<Request> readRequest(const IncomingRequest& incoming) {
 }
 
 std::string describe(const Request& request) {
-    const auto hash = shownHash(request.hash);
-    const auto account = shownText(request.account);
+    const auto hash = platform::hexadecimal(request.hash);
+    const auto account = platform::harmlessText(request.account);
     switch (request.operation) {
         case Operation::Login:
             return platform::text("Logging in with {} of the card {}", hash,
-                                  shownText(request.tokenIdentifier));
+                                  platform::harmlessText(request.tokenIdentifier));
         case Operation::TokenInfo:
             return "Listing the inserted cards";
         case Operation::Pair:

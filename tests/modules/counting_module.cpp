@@ -6,7 +6,7 @@
 
 #include "tests/modules/real_module.h"
 
-using vlm::tests::realModule;
+using vlm::test::realModule;
 
 static void note(const char* what) {
     if (const char* file = std::getenv("VLM_TEST_LOGIN_COUNT"))

@@ -12,7 +12,7 @@ static CK_RV findObjects(CK_SESSION_HANDLE, CK_OBJECT_HANDLE* objects, CK_ULONG 
 }
 
 VLM_MODULE_ENTRY C_GetFunctionList(CK_FUNCTION_LIST** list) {
-    static CK_FUNCTION_LIST functions = vlm::tests::realModule();
+    static CK_FUNCTION_LIST functions = vlm::test::realModule();
     functions.C_FindObjects = findObjects;
     *list = &functions;
     return CKR_OK;

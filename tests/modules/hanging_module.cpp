@@ -14,7 +14,7 @@ static CK_RV hang(CK_SLOT_ID, CK_TOKEN_INFO*) {
 }
 
 VLM_MODULE_ENTRY C_GetFunctionList(CK_FUNCTION_LIST** list) {
-    static CK_FUNCTION_LIST functions = vlm::tests::realModule();
+    static CK_FUNCTION_LIST functions = vlm::test::realModule();
     functions.C_GetTokenInfo = hang;
     *list = &functions;
     return CKR_OK;

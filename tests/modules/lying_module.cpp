@@ -5,7 +5,7 @@
 
 #include "tests/modules/real_module.h"
 
-using vlm::tests::realModule;
+using vlm::test::realModule;
 
 static constexpr CK_ULONG kAbsurd = CK_ULONG{1} << 40U;
 

@@ -10,7 +10,7 @@
 
 #include "tests/modules/real_module.h"
 
-using vlm::tests::realModule;
+using vlm::test::realModule;
 
 static CK_RV getTokenInfo(CK_SLOT_ID slot, CK_TOKEN_INFO* info) {
     const CK_RV result = realModule().C_GetTokenInfo(slot, info);

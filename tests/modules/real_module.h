@@ -6,7 +6,7 @@
 #include <dlfcn.h>
 #include <p11-kit/pkcs11.h>
 
-namespace vlm::tests {
+namespace vlm::test {
 
 inline const CK_FUNCTION_LIST& realModule() {
     static const CK_FUNCTION_LIST* const kModule = [] {
@@ -20,6 +20,6 @@ inline const CK_FUNCTION_LIST& realModule() {
     return *kModule;
 }
 
-}  // namespace vlm::tests
+}  // namespace vlm::test
 
 #define VLM_MODULE_ENTRY extern "C" __attribute__((visibility("default"))) CK_RV

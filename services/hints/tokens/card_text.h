@@ -1,4 +1,4 @@
-// Text that a card brought along, made harmless for screens, logs and messages.
+// Text that a card brought along, for screens, logs and messages.
 
 #pragma once
 
@@ -10,9 +10,8 @@ namespace vlm::service {
 
 inline constexpr std::size_t kCardTextLength = 256;
 
-// Well-formed UTF-8 of at most `length` characters. Each ill-formed piece, control character and
-// character that changes the direction of writing or breaks a line becomes U+FFFD; blanks and
-// zeros at both ends are taken off.
-std::string harmlessText(std::string_view text, std::size_t length = kCardTextLength);
+// The text made harmless (platform/harmless_text.h), without the blanks and zeros that cards fill
+// their fields up with, and cut to `most` characters.
+std::string cardText(std::string_view text, std::size_t most = kCardTextLength);
 
 }  // namespace vlm::service

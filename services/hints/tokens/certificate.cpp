@@ -17,7 +17,7 @@ std::string textOf(const ASN1_STRING* string) {
     if (size < 0) return {};
     std::string text(reinterpret_cast<const char*>(utf8), static_cast<std::size_t>(size));
     OPENSSL_free(utf8);
-    return harmlessText(text);
+    return cardText(text);
 }
 
 std::string subjectField(const X509* certificate, int nid) {

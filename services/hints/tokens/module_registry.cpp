@@ -10,8 +10,8 @@
 #include <set>
 #include <string_view>
 
+#include "platform/harmless_text.h"
 #include "platform/system_log.h"
-#include "services/hints/tokens/card_text.h"
 
 namespace vlm::service {
 namespace {
@@ -101,7 +101,7 @@ void addFolder(const std::string& folder, std::map<std::string, Settings>& modul
         auto settings = content ? parse(*content) : std::nullopt;
         if (!settings) {
             kLog.error("the card module file {} is left out: it {}",
-                       harmlessText(file->path().string()),
+                       platform::harmlessText(file->path().string()),
                        content ? "is not well formed" : "cannot be read");
             continue;
         }
@@ -127,8 +127,9 @@ std::vector<ConfiguredModule> configuredModules(const ModuleFolders& folders) {
         const fs::path path =
             fs::canonical(fs::path(folders.modules) / settingOf(settings, "module"), error);
         if (error)
-            kLog.error("the card module {} is left out: there is no {}", harmlessText(name),
-                       harmlessText(settingOf(settings, "module")));
+            kLog.error("the card module {} is left out: there is no {}",
+                       platform::harmlessText(name),
+                       platform::harmlessText(settingOf(settings, "module")));
         else
             modules.push_back({priorityOf(settings), {name, path}});
     }

@@ -22,14 +22,14 @@ std::string field(const CK_UTF8CHAR (&padded)[size]) {
 std::string resultText(CK_RV result) {
     std::ostringstream number;
     number << std::hex << std::showbase << result;
-    return platform::text("{} ({})", harmlessText(p11_kit_strerror(result)), number.str());
+    return platform::text("{} ({})", cardText(p11_kit_strerror(result)), number.str());
 }
 
 std::unique_ptr<Pkcs11Module> Pkcs11Module::load(const std::string& path, std::string* reason) {
     CK_FUNCTION_LIST* module = p11_kit_module_load(path.c_str(), P11_KIT_MODULE_CRITICAL);
     if (module == nullptr) {
         const char* message = p11_kit_message();
-        *reason = "it cannot be loaded: " + harmlessText(message == nullptr ? path : message);
+        *reason = "it cannot be loaded: " + cardText(message == nullptr ? path : message);
         return nullptr;
     }
     const CK_RV result = p11_kit_module_initialize(module);

@@ -14,7 +14,7 @@ std::optional<CertificateObject> readCertificateObject(const Pkcs11Session& sess
     auto facts = readCertificate(*der);
     if (!facts) return {};
     return CertificateObject{attributes.bytes(CKA_ID).value_or(Bytes{}),
-                             harmlessText(attributes.text(CKA_LABEL)), std::move(*facts)};
+                             cardText(attributes.text(CKA_LABEL)), std::move(*facts)};
 }
 
 bool readKeys(const Pkcs11Session& session, CK_OBJECT_CLASS objectClass, TokenObjects& objects) {
@@ -42,7 +42,7 @@ Token describeToken(const SlotToken& slotToken) {
     token.identifier = tokenIdentifier(slotToken.fields);
     for (const std::string* text :
          {&slotToken.fields.label, &slotToken.fields.model, &slotToken.fields.manufacturer}) {
-        token.name = harmlessText(*text);
+        token.name = cardText(*text);
         if (!token.name.empty()) break;
     }
     token.hasPinPad = (slotToken.flags & CKF_PROTECTED_AUTHENTICATION_PATH) != 0;

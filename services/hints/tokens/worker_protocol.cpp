@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "platform/harmless_text.h"
 #include "platform/property_list.h"
 #include "services/hints/tokens/card_text.h"
 #include "services/hints/tokens/frames.h"
@@ -44,8 +45,9 @@ public:
         if (text == nullptr || text->size() > most) return fail<std::string>();
         return *text;
     }
-    std::string shownText(std::string_view key, std::size_t characters) {
-        return harmlessText(text(key, characters * 4), characters);
+    std::string cardText(std::string_view key, std::size_t characters) {
+        return vlm::service::cardText(text(key, characters * 4 + platform::kCutMark.size()),
+                                      characters);
     }
     Bytes bytes(std::string_view key, std::size_t least, std::size_t most) {
         const PropertyList* value = find(key);
@@ -111,7 +113,7 @@ std::optional<Identity> decodeIdentity(const PropertyList& value) {
     identity.publicKeyInfo = entries.bytes("key", 1, kMostKeyBytes);
     // The hash is made here, so that it is right whatever the worker is up to.
     identity.publicKeyHash = sha256(identity.publicKeyInfo);
-    identity.name = entries.shownText("name", kCardTextLength);
+    identity.name = entries.cardText("name", kCardTextLength);
     identity.notBefore = entries.integer("from");
     identity.notAfter = entries.integer("until");
     identity.canSign = entries.boolean("signs");
@@ -142,7 +144,7 @@ std::optional<Token> decodeToken(const PropertyList& value) {
     Entries entries(&value);
     Token token;
     token.identifier = entries.text("id", kMostIdentifierBytes);
-    token.name = entries.shownText("name", kCardTextLength);
+    token.name = entries.cardText("name", kCardTextLength);
     token.hasPinPad = entries.boolean("pad");
     token.needsLogin = entries.boolean("login");
     token.pinState = entries.oneOf("pin", PinState::Locked);
@@ -165,7 +167,7 @@ std::optional<ListAnswer> decodeListAnswer(Entries entries) {
     ListAnswer answer;
     for (const PropertyList& each : entries.array("problems", kMostProblems)) {
         if (each.text() == nullptr) return {};
-        answer.problems.push_back(harmlessText(*each.text(), kMostReasonCharacters));
+        answer.problems.push_back(cardText(*each.text(), kMostReasonCharacters));
     }
     if (entries.has("tokens")) {
         answer.tokens.emplace();
@@ -184,7 +186,7 @@ std::optional<Proof> decodeProof(Entries entries) {
     proof.outcome = entries.oneOf("outcome", Proof::Outcome::CardFailed);
     proof.signature = entries.bytes("signature", 0, kMostSignatureBytes);
     proof.pinStateAfter = entries.oneOf("pin", PinState::Locked);
-    proof.reason = entries.shownText("reason", kMostReasonCharacters);
+    proof.reason = entries.cardText("reason", kMostReasonCharacters);
     if (entries.failed()) return {};
     return proof;
 }
@@ -248,7 +250,7 @@ std::optional<std::variant<ListAnswer, Proof, FailedAnswer>> decodeAnswer(
     const auto value = platform::readPropertyList(message, kLimits);
     Entries entries(value ? &*value : nullptr);
     if (entries.has("failed")) {
-        FailedAnswer answer{entries.shownText("failed", kMostReasonCharacters)};
+        FailedAnswer answer{entries.cardText("failed", kMostReasonCharacters)};
         if (entries.failed()) return {};
         return answer;
     }

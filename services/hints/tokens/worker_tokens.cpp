@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <utility>
 
-#include "services/hints/tokens/card_text.h"
+#include "platform/harmless_text.h"
 
 namespace vlm::service {
 
@@ -14,8 +14,9 @@ WorkerTokens::WorkerTokens(sd_event* event, const WorkerTokensOptions& options)
         command.arguments = {options.workerProgram, std::to_string(options.lookAgainAfter.count()),
                              module.path};
         command.environment = options.environment;
-        _workers.push_back(std::make_unique<CardWorker>(
-            event, _graveyard, harmlessText(module.name), std::move(command), options.limits));
+        _workers.push_back(std::make_unique<CardWorker>(event, _graveyard,
+                                                        platform::harmlessText(module.name),
+                                                        std::move(command), options.limits));
     }
 }
 

@@ -12,6 +12,7 @@
 #include <cerrno>
 #include <csignal>
 #include <system_error>
+#include <thread>
 #include <utility>
 
 namespace vlm::test {
@@ -195,6 +196,15 @@ void Child::drain(Stream& stream) {
             return;
         }
     }
+}
+
+bool eventually(const std::function<bool()>& isSo) {
+    const auto deadline = std::chrono::steady_clock::now() + Child::kPatience;
+    while (!isSo()) {
+        if (std::chrono::steady_clock::now() > deadline) return false;
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return true;
 }
 
 Ended run(std::vector<std::string> arguments, const Child::Options& options,

@@ -11,6 +11,7 @@
 #include <sys/types.h>
 
 #include <chrono>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
@@ -20,10 +21,12 @@ namespace vlm::test {
 
 class Child {
 public:
+    // Set on top of the test's own environment; none takes a variable away.
+    using Environment = std::map<std::string, std::optional<std::string>>;
+
     struct Options {
-        // Set on top of the test's own environment; none takes a variable away.
-        std::map<std::string, std::optional<std::string>> environment;
-        std::optional<uid_t> user;  // user and group id to run as; the caller must be root
+        Environment environment{};
+        std::optional<uid_t> user{};  // user and group id to run as; the caller must be root
     };
     static constexpr std::chrono::milliseconds kPatience = std::chrono::seconds(20);
 
@@ -73,6 +76,9 @@ private:
     Stream _errors;
     std::optional<int> _status;
 };
+
+// Waits until it is so, as long as a child may take.
+bool eventually(const std::function<bool()>& isSo);
 
 // Runs a program to its end with this on its standard input.
 struct Ended {

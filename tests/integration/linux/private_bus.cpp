@@ -59,4 +59,18 @@ PrivateBus::PrivateBus(const Options& options) {
     _address = _daemon->output().substr(0, _daemon->output().find('\n'));
 }
 
+PrivateBus::Options PrivateBus::underPolicy(const std::filesystem::path& policyFile) {
+    Options options;
+    options.permissive = false;
+    options.includes = {policyFile};
+    return options;
+}
+
+bool PrivateBus::hasOwner(const std::string& name) const {
+    const auto ended = run({"dbus-send", "--bus=" + _address, "--print-reply=literal",
+                            "--dest=org.freedesktop.DBus", "/", "org.freedesktop.DBus.NameHasOwner",
+                            "string:" + name});
+    return ended.output.find("true") != std::string::npos;
+}
+
 }  // namespace vlm::test

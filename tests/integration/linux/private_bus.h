@@ -28,7 +28,12 @@ public:
     PrivateBus() : PrivateBus(Options()) {}
     explicit PrivateBus(const Options& options);
 
+    // A system bus that allows no more than the policy file says.
+    static Options underPolicy(const std::filesystem::path& policyFile);
+
     const std::string& address() const { return _address; }
+
+    bool hasOwner(const std::string& name) const;
 
     // The bus goes away, as after a crash.
     void stop() { _daemon.reset(); }

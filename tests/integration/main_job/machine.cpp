@@ -7,21 +7,9 @@
 
 namespace vlm::test {
 
-namespace {
-
-// The policy that gets installed, on a bus that allows nothing else, as the system's own.
-PrivateBus::Options installedPolicy() {
-    PrivateBus::Options options;
-    options.permissive = false;
-    options.includes = {VLM_BUS_POLICY};
-    return options;
-}
-
-}  // namespace
-
 // The build tree may lie where only its owner gets in; its programs find their library and their
 // files relative to themselves.
-Machine::Machine() : _bus(installedPolicy()) {
+Machine::Machine() : _bus(PrivateBus::underPolicy(VLM_BUS_POLICY)) {
     const std::filesystem::path from = VLM_BUILD_TREE;
     const auto to = _folder.path() / "tree";
     std::filesystem::create_directories(to / "bin");
@@ -35,18 +23,14 @@ Machine::Machine() : _bus(installedPolicy()) {
     std::filesystem::copy(from / "share", to / "share", std::filesystem::copy_options::recursive);
 }
 
-std::map<std::string, std::optional<std::string>> Machine::environment() const {
-    std::map<std::string, std::optional<std::string>> variables{
-        {"DBUS_SYSTEM_BUS_ADDRESS", _bus.address()},
-        {"DBUS_SESSION_BUS_ADDRESS", std::nullopt},
-        {"LANGUAGE", std::nullopt},
-        {"LC_ALL", "C"},
-        {"VLM_LOG_TARGET", "none"},
-        {"VLM_LOG_LEVEL", std::nullopt}};
-    for (const auto& entry : cards.environment()) {
-        const auto equals = entry.find('=');
-        variables[entry.substr(0, equals)] = entry.substr(equals + 1);
-    }
+Child::Environment Machine::environment() const {
+    Child::Environment variables{{"DBUS_SYSTEM_BUS_ADDRESS", _bus.address()},
+                                 {"DBUS_SESSION_BUS_ADDRESS", std::nullopt},
+                                 {"LANGUAGE", std::nullopt},
+                                 {"LC_ALL", "C"},
+                                 {"VLM_LOG_TARGET", "none"},
+                                 {"VLM_LOG_LEVEL", std::nullopt}};
+    variables.merge(cards.environment());
     return variables;
 }
 
@@ -60,14 +44,8 @@ void Machine::startService(const std::string& typedPin) {
                                  "--modules", cards.moduleDirectory(), "--pinentry",
                                  VLM_ANSWERING_PINENTRY},
         options);
-    const auto hasName = [this] {
-        return test::run({"dbus-send", "--bus=" + _bus.address(), "--print-reply=literal",
-                          "--dest=org.freedesktop.DBus", "/", "org.freedesktop.DBus.NameHasOwner",
-                          "string:org.vlm.token.hints.daemon"})
-                   .output.find("true") != std::string::npos;
-    };
-    for (int tries = 0; tries < 200 && !hasName(); ++tries) usleep(20'000);
-    ASSERT_TRUE(hasName()) << _service->errors();
+    ASSERT_TRUE(eventually([this] { return _bus.hasOwner("org.vlm.token.hints.daemon"); }))
+        << _service->errors();
 }
 
 void Machine::stopService() {
@@ -76,13 +54,13 @@ void Machine::stopService() {
 }
 
 Ended Machine::vlmbind(std::vector<std::string> arguments, std::optional<uid_t> user,
-                       std::map<std::string, std::optional<std::string>> variables) {
+                       Child::Environment variables) {
     arguments.insert(arguments.begin(), tool());
     return run(std::move(arguments), user, std::move(variables));
 }
 
 Ended Machine::run(std::vector<std::string> command, std::optional<uid_t> user,
-                   std::map<std::string, std::optional<std::string>> variables) {
+                   Child::Environment variables) {
     // Each user has a home of their own, where the tool makes its private folders.
     const auto home = _folder.path() / ("home-" + std::to_string(user.value_or(getuid())));
     std::filesystem::create_directories(home);
@@ -104,11 +82,10 @@ Ended Machine::run(std::vector<std::string> command, std::optional<uid_t> user,
 
 std::string Machine::listingOnceItShows(const std::string& text) {
     std::string listing;
-    for (int tries = 0; tries < 100; ++tries) {
+    eventually([&] {
         listing = vlmbind({"-i"}).output;
-        if (text.empty() ? listing.empty() : listing.find(text) != std::string::npos) break;
-        usleep(50'000);
-    }
+        return text.empty() ? listing.empty() : listing.find(text) != std::string::npos;
+    });
     return listing;
 }
 

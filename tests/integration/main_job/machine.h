@@ -4,7 +4,6 @@
 #pragma once
 
 #include <filesystem>
-#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -16,8 +15,6 @@
 #include "tests/tools/soft_card/soft_cards.h"
 
 namespace vlm::test {
-
-using tests::SoftCards;
 
 class Machine {
 public:
@@ -35,9 +32,9 @@ public:
     // Runs the tool to its end, as the user that the test runs as or as another; run() the same
     // with a whole command.
     Ended vlmbind(std::vector<std::string> arguments, std::optional<uid_t> user = std::nullopt,
-                  std::map<std::string, std::optional<std::string>> environment = {});
+                  Child::Environment environment = {});
     Ended run(std::vector<std::string> command, std::optional<uid_t> user = std::nullopt,
-              std::map<std::string, std::optional<std::string>> environment = {});
+              Child::Environment environment = {});
 
     // The listing, once it holds the text, or is empty for an empty one; or the last one after some
     // seconds. The service looks at software cards for news once a second.
@@ -47,7 +44,7 @@ public:
     const std::string& serviceLog();
 
 private:
-    std::map<std::string, std::optional<std::string>> environment() const;
+    Child::Environment environment() const;
 
     TemporaryFolder _folder;
     PrivateBus _bus;

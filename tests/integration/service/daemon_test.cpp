@@ -156,7 +156,7 @@ TEST_F(DaemonTest, RunsOnce) {
 
     EXPECT_EQ(second.status, 1);
     EXPECT_THAT(second.errors, HasSubstr("another program has the name"));
-    EXPECT_TRUE(machine.hasOwner(machine.systemBus(), kDaemon));
+    EXPECT_TRUE(machine.systemBus().hasOwner(kDaemon));
 }
 
 TEST_F(DaemonTest, TakesNoNameBeforeItsPairingsAreThere) {

@@ -5,20 +5,12 @@
 
 #include <algorithm>
 #include <chrono>
-#include <thread>
 
 namespace vlm::test {
 
 namespace fs = std::filesystem;
 
 namespace {
-
-PrivateBus::Options installedPolicy() {
-    PrivateBus::Options options;
-    options.permissive = false;
-    options.includes = {VLM_BUS_POLICY};
-    return options;
-}
 
 PrivateBus::Options sessionBusOptions() {
     PrivateBus::Options options;
@@ -38,7 +30,8 @@ std::string between(const std::string& text, const std::string& left, const std:
 
 // The build tree may lie where only its owner gets in, and some tests run its programs as another
 // user.
-HintsMachine::HintsMachine() : _systemBus(installedPolicy()), _sessionBus(sessionBusOptions()) {
+HintsMachine::HintsMachine()
+    : _systemBus(PrivateBus::underPolicy(VLM_BUS_POLICY)), _sessionBus(sessionBusOptions()) {
     for (const char* program : {VLM_HINTS_SERVICE, VLM_HINTS_CALL})
         fs::copy_file(program, _folder.path() / fs::path(program).filename());
     fs::create_directory(commonFolder());
@@ -46,7 +39,7 @@ HintsMachine::HintsMachine() : _systemBus(installedPolicy()), _sessionBus(sessio
 }
 
 void HintsMachine::insertCard(const std::string& name) {
-    _cards.add("Card", {tests::identity("p256", name)});
+    _cards.add("Card", {identity("p256", name)});
     if (!_daemon) return;
     const auto list = call({"op=1", "uid=-1"});
     _hash = between(list, "<", ">");
@@ -138,31 +131,13 @@ Child::Options HintsMachine::options(std::optional<uid_t> user) const {
                            {"VLM_LOG_TARGET", "stderr"},
                            {"DISPLAY", std::nullopt},
                            {"WAYLAND_DISPLAY", std::nullopt}};
-    for (const auto& entry : _cards.environment()) {
-        const auto sign = entry.find('=');
-        options.environment[entry.substr(0, sign)] = entry.substr(sign + 1);
-    }
+    options.environment.merge(_cards.environment());
     return options;
-}
-
-bool HintsMachine::hasOwner(const PrivateBus& bus, const std::string& name) const {
-    const auto ended = run({"busctl", "--address=" + bus.address(), "call", "org.freedesktop.DBus",
-                            "/", "org.freedesktop.DBus", "NameHasOwner", "s", name});
-    return ended.output == "b true\n";
-}
-
-bool HintsMachine::eventually(const std::function<bool()>& isSo) {
-    const auto deadline = std::chrono::steady_clock::now() + Child::kPatience;
-    while (!isSo()) {
-        if (std::chrono::steady_clock::now() > deadline) return false;
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    return true;
 }
 
 void HintsMachine::waitForName(Child& instance, const PrivateBus& bus, const std::string& name) {
     const bool isUp = eventually(
-        [&] { return instance.wait(std::chrono::milliseconds(0)) || hasOwner(bus, name); });
+        [&] { return instance.wait(std::chrono::milliseconds(0)) || bus.hasOwner(name); });
     ASSERT_TRUE(isUp) << name << " is not on the bus";
     ASSERT_FALSE(instance.wait(std::chrono::milliseconds(0))) << instance.errors();
 }

@@ -6,7 +6,6 @@
 
 #include <sys/types.h>
 
-#include <functional>
 #include <map>
 #include <memory>
 #include <optional>
@@ -60,16 +59,12 @@ public:
     std::string answeringPinentry() const;
 
     Child::Options options(std::optional<uid_t> user = std::nullopt) const;
-    bool hasOwner(const PrivateBus& bus, const std::string& name) const;
     PrivateBus& systemBus() { return _systemBus; }
     PrivateBus& sessionBus() { return _sessionBus; }
     const TemporaryFolder& folder() const { return _folder; }
 
     // Where any user may write.
     std::filesystem::path commonFolder() const { return _folder.path() / "common"; }
-
-    // Waits until it is so.
-    static bool eventually(const std::function<bool()>& isSo);
 
 private:
     std::string callOn(const std::string& name, const std::vector<std::string>& arguments,
@@ -79,7 +74,7 @@ private:
     TemporaryFolder _folder;
     PrivateBus _systemBus;
     PrivateBus _sessionBus;
-    tests::SoftCards _cards;
+    SoftCards _cards;
     std::string _hash;
     std::string _token;
     std::unique_ptr<Child> _daemon;

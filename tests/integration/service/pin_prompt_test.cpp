@@ -160,22 +160,22 @@ TEST_F(PinPromptTest, EndsAndPutsTheTerminalBackWhenTheCallerIsGone) {
     start("/usr/bin/pinentry-tty");
     Pty terminal(loginOnTerminal(), machine.options());
     ASSERT_TRUE(terminal.waitFor("PIN:")) << terminal.seen();
-    ASSERT_TRUE(HintsMachine::eventually([&] { return !terminal.echoes(); }));
+    ASSERT_TRUE(eventually([&] { return !terminal.echoes(); }));
 
     terminal.kill();
 
-    EXPECT_TRUE(HintsMachine::eventually([&] { return terminal.echoes(); }));
+    EXPECT_TRUE(eventually([&] { return terminal.echoes(); }));
 }
 
 TEST_F(PinPromptTest, EndsWithItsCaller) {
     start(machine.pinentry("echo $$ >" + noteTo("pid") + "; echo OK; exec sleep 1000\n"));
     auto caller =
         std::make_unique<Child>(machine.callCommand(kDaemon, machine.login()), machine.options());
-    ASSERT_TRUE(HintsMachine::eventually([&] { return isRunning(file("pid")); }));
+    ASSERT_TRUE(eventually([&] { return isRunning(file("pid")); }));
 
     caller.reset();
 
-    EXPECT_TRUE(HintsMachine::eventually([&] { return !isRunning(file("pid")); }));
+    EXPECT_TRUE(eventually([&] { return !isRunning(file("pid")); }));
     EXPECT_EQ(machine.call({"op=6", "str1=root"}), "res 0\n");
 }
 
@@ -184,19 +184,19 @@ TEST_F(PinPromptTest, EndsWithTheDaemon) {
         std::filesystem::remove(noteTo("pid"));
         start(machine.pinentry("echo $$ >" + noteTo("pid") + "; echo OK; exec sleep 1000\n"));
         Child caller(machine.callCommand(kDaemon, machine.login()), machine.options());
-        ASSERT_TRUE(HintsMachine::eventually([&] { return isRunning(file("pid")); }));
+        ASSERT_TRUE(eventually([&] { return isRunning(file("pid")); }));
 
         machine.daemon().signal(signal);
 
         EXPECT_TRUE(machine.daemon().wait());
-        EXPECT_TRUE(HintsMachine::eventually([&] { return !isRunning(file("pid")); })) << signal;
+        EXPECT_TRUE(eventually([&] { return !isRunning(file("pid")); })) << signal;
     }
 }
 
 TEST_F(PinPromptTest, KeepsNobodyElseWaiting) {
     start(machine.pinentry("echo $$ >" + noteTo("pid") + "; echo OK; exec sleep 1000\n"));
     Child waiting(machine.callCommand(kDaemon, machine.login()), machine.options());
-    ASSERT_TRUE(HintsMachine::eventually([&] { return isRunning(file("pid")); }));
+    ASSERT_TRUE(eventually([&] { return isRunning(file("pid")); }));
 
     EXPECT_THAT(machine.call({"op=1", "uid=-1"}), HasSubstr("Alice Example"));
     EXPECT_EQ(machine.call(machine.login({"str2=123456"})), "res 0\n");

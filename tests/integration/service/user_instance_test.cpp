@@ -124,8 +124,8 @@ TEST_F(UserInstanceTest, RegistersAgainWhenTheDaemonStartsAgain) {
     machine.stopDaemon();
     machine.startDaemon();
 
-    EXPECT_TRUE(HintsMachine::eventually(
-        [&] { return machine.callAgent(machine.login(), kNobodyUser) == "res 0\n"; }));
+    EXPECT_TRUE(
+        eventually([&] { return machine.callAgent(machine.login(), kNobodyUser) == "res 0\n"; }));
 }
 
 TEST_F(UserInstanceTest, IsForgottenWhenItEnds) {
@@ -145,11 +145,11 @@ TEST_F(UserInstanceTest, EndsThePromptWhenTheCallerIsGone) {
                            "; echo OK; exec sleep 1000\n"));
     auto caller = std::make_unique<Child>(machine.callCommand(kAgent, machine.login()),
                                           machine.options(kNobodyUser));
-    ASSERT_TRUE(HintsMachine::eventually(isOpen));
+    ASSERT_TRUE(eventually(isOpen));
 
     caller.reset();
 
-    EXPECT_TRUE(HintsMachine::eventually([&] { return !isOpen(); }));
+    EXPECT_TRUE(eventually([&] { return !isOpen(); }));
 }
 
 TEST_F(UserInstanceTest, GivesNoPinToAnotherProgram) {

@@ -12,7 +12,7 @@
 #include "services/hints/tokens/token_identifier.h"
 #include "tests/integration/tokens/tokens_test.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 using testing::ElementsAre;
@@ -28,7 +28,7 @@ std::string hexOf(const platform::Bytes& bytes) {
 class AgreementTest : public TokensTest {
 protected:
     std::string run(const std::vector<std::string>& command) {
-        const auto result = runProgram(command, cards.wholeEnvironment());
+        const auto result = test::run(command, {.environment = cards.environment()});
         EXPECT_EQ(result.status, 0) << testing::PrintToString(command) << result.errors;
         return result.output;
     }
@@ -224,4 +224,4 @@ TEST_F(AgreementTest, IdentifiersAreSpelledAsP11KitSpellsThem) {
 }
 
 }  // namespace
-}  // namespace vlm::tests
+}  // namespace vlm::test

@@ -15,7 +15,7 @@
 
 #include "tests/integration/tokens/tokens_test.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 using testing::ElementsAre;
@@ -191,4 +191,4 @@ TEST_F(BadModulesTest, AWorkerThatHangsDiesWithTheProcessThatStartedIt) {
 }
 
 }  // namespace
-}  // namespace vlm::tests
+}  // namespace vlm::test

@@ -10,7 +10,7 @@
 #include "services/hints/tokens/signature.h"
 #include "tests/integration/tokens/tokens_test.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 using testing::ElementsAre;
@@ -194,4 +194,4 @@ TEST_F(ListingTest, HoldsFiftyCards) {
 }
 
 }  // namespace
-}  // namespace vlm::tests
+}  // namespace vlm::test

@@ -7,7 +7,7 @@
 #include "services/hints/tokens/signature.h"
 #include "tests/integration/tokens/tokens_test.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 using Outcome = Proof::Outcome;
@@ -251,4 +251,4 @@ TEST_F(PinPadTest, SomebodyWhoWentAwayCostsTheProofOnly) {
 }
 
 }  // namespace
-}  // namespace vlm::tests
+}  // namespace vlm::test

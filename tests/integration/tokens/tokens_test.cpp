@@ -6,7 +6,7 @@
 #include <cerrno>
 #include <chrono>
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 using namespace std::chrono_literals;
@@ -27,7 +27,8 @@ TokensTest::TokensTest() {
     _event.reset(event);
     options.workerProgram = VLM_TOKEN_WORKER;
     options.folders = {cards.moduleDirectory(), cards.folder() / "admin", cards.folder()};
-    options.environment = cards.environment();
+    for (const auto& [name, value] : cards.environment())
+        options.environment.push_back(name + "=" + value.value());
     options.lookAgainAfter = 0ms;
     options.limits.list = 30s;  // of no interest to most tests, and sanitizers are slow
 }
@@ -97,4 +98,4 @@ std::vector<std::string> namesOf(const std::vector<Identity>& identities) {
 }
 std::vector<std::string> namesOf(const std::vector<Token>& tokens) { return sortedNames(tokens); }
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

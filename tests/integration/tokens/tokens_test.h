@@ -10,7 +10,7 @@
 #include "services/hints/tokens/worker_tokens.h"
 #include "tests/tools/soft_card/soft_cards.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 
 using service::Identity;
 using service::PinState;
@@ -58,4 +58,4 @@ private:
 std::vector<std::string> namesOf(const std::vector<Identity>& identities);
 std::vector<std::string> namesOf(const std::vector<Token>& tokens);
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

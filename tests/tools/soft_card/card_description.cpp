@@ -4,7 +4,7 @@
 #include <functional>
 #include <map>
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 using Setter = std::function<bool(std::string value)>;
@@ -169,4 +169,4 @@ CardIdentity identity(std::string key, std::string commonName) {
     return identity;
 }
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

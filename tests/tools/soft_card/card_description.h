@@ -15,7 +15,7 @@
 #include <string_view>
 #include <vector>
 
-namespace vlm::tests {
+namespace vlm::test {
 
 struct CardCertificate {
     std::string commonName{};
@@ -56,4 +56,4 @@ std::vector<std::string> describeCard(const Card& card);
 // An identity with one certificate, as most tests want it.
 CardIdentity identity(std::string key, std::string commonName);
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

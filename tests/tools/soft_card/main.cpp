@@ -14,14 +14,14 @@ int main(int argc, char* argv[]) {
         for (std::string word; std::cin >> word;) words.push_back(word);
 
     std::string reason;
-    const auto cards = vlm::tests::readCards(words, &reason);
+    const auto cards = vlm::test::readCards(words, &reason);
     if (!cards || cards->empty()) {
         if (cards)
             reason = "usage: soft-card token label=NAME pin=PIN identity key=KIND cn=NAME ...";
         std::cerr << "soft-card: " << reason << "\n";
         return 2;
     }
-    vlm::tests::SoftTokenStore store(VLM_SOFTHSM_MODULE);
+    vlm::test::SoftTokenStore store(VLM_SOFTHSM_MODULE);
     for (const auto& card : *cards) {
         if (const auto failure = store.write(card)) {
             std::cerr << "soft-card: " << *failure << "\n";

@@ -7,7 +7,7 @@
 #include <fstream>
 #include <set>
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 namespace fs = std::filesystem;
@@ -64,7 +64,7 @@ void SoftCards::add(const std::vector<Card>& cards) {
     std::string description;
     for (const Card& card : cards)
         for (const std::string& word : describeCard(card)) description += word + "\n";
-    const auto result = runProgram({VLM_SOFT_CARD}, wholeEnvironment(), description);
+    const auto result = run({VLM_SOFT_CARD}, {.environment = environment()}, description);
     ASSERT_EQ(result.status, 0) << result.errors;
 }
 
@@ -75,15 +75,8 @@ void SoftCards::remove(const std::string& label) {
     _tokensByLabel.erase(first, last);
 }
 
-std::vector<std::string> SoftCards::environment() const {
-    return {"SOFTHSM2_CONF=" + (_folder / "softhsm2.conf").string()};
-}
-
-std::vector<std::string> SoftCards::wholeEnvironment() const {
-    std::vector<std::string> whole = environment();
-    for (char** entry = environ; *entry != nullptr; ++entry)
-        if (!std::string_view(*entry).starts_with("SOFTHSM2_CONF=")) whole.emplace_back(*entry);
-    return whole;
+Child::Environment SoftCards::environment() const {
+    return {{"SOFTHSM2_CONF", _folder / "softhsm2.conf"}};
 }
 
 void SoftCards::configureModule(const std::string& name, const std::string& content) {
@@ -92,4 +85,4 @@ void SoftCards::configureModule(const std::string& name, const std::string& cont
 
 std::string SoftCards::modulePath() { return VLM_SOFTHSM_MODULE; }
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

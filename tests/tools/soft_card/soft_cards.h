@@ -14,9 +14,10 @@
 #include <string>
 #include <vector>
 
+#include "tests/integration/linux/child.h"
 #include "tests/tools/soft_card/card_description.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 
 class SoftCards {
 public:
@@ -37,11 +38,8 @@ public:
     // Pulls all cards out that were put in one by one under the label.
     void remove(const std::string& label);
 
-    // "NAME=value" entries that a program needs to see these cards.
-    std::vector<std::string> environment() const;
-
-    // The environment of this process with environment() in it.
-    std::vector<std::string> wholeEnvironment() const;
+    // What a program needs in its environment to see these cards.
+    Child::Environment environment() const;
 
     // A folder of .module files with the software module in it.
     std::string moduleDirectory() const { return _folder / "modules"; }
@@ -62,15 +60,4 @@ private:
     std::multimap<std::string, std::filesystem::path> _tokensByLabel;
 };
 
-// What a program printed and how it ended, run with the given environment and nothing on its
-// standard input.
-struct ProgramResult {
-    int status = -1;  // as a shell counts it: 128 and the signal's number when one ended it
-    std::string output;
-    std::string errors;
-};
-ProgramResult runProgram(const std::vector<std::string>& arguments,
-                         const std::vector<std::string>& environment,
-                         const std::string& input = {});
-
-}  // namespace vlm::tests
+}  // namespace vlm::test

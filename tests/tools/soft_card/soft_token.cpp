@@ -10,7 +10,7 @@
 
 #include "tests/tools/soft_card/test_key.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 class Failure : public std::runtime_error {
@@ -204,4 +204,4 @@ std::optional<std::string> SoftTokenStore::write(const Card& card) {
     }
 }
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

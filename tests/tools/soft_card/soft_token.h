@@ -10,7 +10,7 @@
 
 #include "tests/tools/soft_card/card_description.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 
 class SoftTokenStore {
 public:
@@ -26,4 +26,4 @@ private:
     CK_FUNCTION_LIST* _module = nullptr;
 };
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

@@ -9,7 +9,7 @@
 
 #include <map>
 
-namespace vlm::tests {
+namespace vlm::test {
 namespace {
 
 struct BignumFree {
@@ -121,4 +121,4 @@ std::optional<CertificateParts> certify(const Key& key, const CardCertificate& c
                             derOf<ASN1_INTEGER>(X509_get0_serialNumber(x509), i2d_ASN1_INTEGER)};
 }
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

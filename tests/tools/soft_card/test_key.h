@@ -11,7 +11,7 @@
 
 #include "tests/tools/soft_card/card_description.h"
 
-namespace vlm::tests {
+namespace vlm::test {
 
 using Octets = std::string;
 
@@ -42,4 +42,4 @@ struct CertificateParts {
 // A certificate that the key signed itself; none when an extension's text is not understood.
 std::optional<CertificateParts> certify(const Key& key, const CardCertificate& certificate);
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

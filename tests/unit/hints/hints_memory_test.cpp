@@ -8,12 +8,17 @@
 namespace vlm::hints {
 namespace {
 
+using test::kAnySize;
+using test::largestPiece;
+using test::piecesWithSecret;
+using test::secret;
+
 // Memory runs out when the bindings are about to be collected.
 class LogOfAMachineOutOfMemory final : public platform::SystemLog {
 public:
     bool collects(LogLevel) const override { return true; }
     void write(const platform::LogRecord& record) override {
-        if (record.text.starts_with("transforming")) tests::largestPiece = 4096;
+        if (record.text.starts_with("transforming")) largestPiece = 4096;
     }
 };
 
@@ -26,7 +31,7 @@ TEST_F(HintsTest, AnswersNoBindingsWhenThereIsNoMemoryForThem) {
     fakePlatform().systemLog = &machine;
 
     const auto none = VLCopyLegacyBindings("alice", false);
-    tests::largestPiece = tests::kAnySize;
+    largestPiece = kAnySize;
 
     EXPECT_FALSE(none);
     EXPECT_EQ(ipc().openConnections, 0);
@@ -48,33 +53,33 @@ TEST(SecretText, IsNotLeftBehindInMemory) {
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(row.why);
-        tests::piecesWithSecret = 0;
-        tests::secret = kPin;
+        piecesWithSecret = 0;
+        secret = kPin;
 
         bool sendable = false;
         {
             Message message;
             sendable = setStringToMsgObject(&message, "str2", row.text);
         }
-        tests::secret = {};
+        secret = {};
 
         EXPECT_EQ(sendable, row.sendable);
-        EXPECT_EQ(tests::piecesWithSecret, 0);
+        EXPECT_EQ(piecesWithSecret, 0);
     }
 }
 
 TEST(SecretText, IsFoundWhereItIsLeftBehind) {
     constexpr std::string_view kPin = "the PIN is 271828";
-    tests::piecesWithSecret = 0;
-    tests::secret = kPin;
+    piecesWithSecret = 0;
+    secret = kPin;
 
     // Called by name: a compiler may leave out what "new" and "delete" would do here.
     void* piece = ::operator new(kPin.size());
     kPin.copy(static_cast<char*>(piece), kPin.size());
     ::operator delete(piece);
-    tests::secret = {};
+    secret = {};
 
-    EXPECT_EQ(tests::piecesWithSecret, 1);
+    EXPECT_EQ(piecesWithSecret, 1);
 }
 
 }  // namespace

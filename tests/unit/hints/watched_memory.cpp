@@ -5,7 +5,7 @@
 #include <cstdlib>
 #include <new>
 
-namespace vlm::tests {
+namespace vlm::test {
 
 std::size_t largestPiece = kAnySize;
 std::string_view secret;
@@ -21,16 +21,16 @@ void search(void* piece) {
 
 }  // namespace
 
-}  // namespace vlm::tests
+}  // namespace vlm::test
 
 void* operator new(std::size_t size) {
-    void* piece = size > vlm::tests::largestPiece ? nullptr : std::malloc(size == 0 ? 1 : size);
+    void* piece = size > vlm::test::largestPiece ? nullptr : std::malloc(size == 0 ? 1 : size);
     if (!piece) throw std::bad_alloc();
     return piece;
 }
 
 void operator delete(void* piece) noexcept {
-    vlm::tests::search(piece);
+    vlm::test::search(piece);
     std::free(piece);
 }
 

@@ -6,7 +6,7 @@
 #include <limits>
 #include <string_view>
 
-namespace vlm::tests {
+namespace vlm::test {
 
 inline constexpr std::size_t kAnySize = std::numeric_limits<std::size_t>::max();
 
@@ -17,4 +17,4 @@ extern std::size_t largestPiece;
 extern std::string_view secret;
 extern int piecesWithSecret;
 
-}  // namespace vlm::tests
+}  // namespace vlm::test

@@ -156,7 +156,7 @@ TEST(WorkerProtocolTest, RefusesTokensThatAreOutOfBounds) {
         {"identifier with a line feed", "id", "pkcs11:token=a\nb"},
         {"identifier beyond ASCII", "id", "pkcs11:token=\u00e9"},
         {"identifier that is too long", "id", "pkcs11:" + std::string(2048, 'x')},
-        {"name that is too long", "name", std::string(1025, 'x')},
+        {"name that is too long", "name", std::string(1028, 'x')},
         {"name of a wrong type", "name", Bytes{1}},
         {"boolean of a wrong type", "pad", 1},
         {"PIN state below the first", "pin", -1},

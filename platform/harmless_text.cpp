@@ -1,10 +1,10 @@
-#include "tool/harmless_text.h"
+#include "platform/harmless_text.h"
 
 #include <algorithm>
 
 #include "platform/utf.h"
 
-namespace vlm {
+namespace vlm::platform {
 
 namespace {
 
@@ -23,24 +23,25 @@ constexpr Range kActing[] = {
     {0x2066, 0x2069},  // isolates
 };
 
-bool acts(char32_t codePoint) {
+}  // namespace
+
+bool actsInsteadOfShowing(char32_t character) {
     return std::ranges::any_of(kActing, [&](const Range& range) {
-        return range.first <= codePoint && codePoint <= range.last;
+        return range.first <= character && character <= range.last;
     });
 }
 
-}  // namespace
-
-std::string harmlessText(std::string_view text) {
+std::string harmlessText(std::string_view text, std::size_t most) {
     std::string harmless;
-    harmless.reserve(text.size());
-    while (!text.empty()) {
-        const auto piece = platform::firstOfUtf8(text);
-        const bool keep = piece.character && !acts(*piece.character);
-        harmless += platform::encodeUtf8(keep ? *piece.character : kReplacement).view();
+    harmless.reserve(std::min(text.size(), most));
+    for (std::size_t characters = 0; !text.empty(); ++characters) {
+        if (characters == most) return harmless.append(kCutMark);
+        const TextPiece piece = firstOfUtf8(text);
+        const bool keep = piece.character && !actsInsteadOfShowing(*piece.character);
+        harmless += encodeUtf8(keep ? *piece.character : kReplacement).view();
         text.remove_prefix(piece.units);
     }
     return harmless;
 }
 
-}  // namespace vlm
+}  // namespace vlm::platform

@@ -1,8 +1,8 @@
-#include "tool/harmless_text.h"
+#include "platform/harmless_text.h"
 
 #include <gtest/gtest.h>
 
-namespace vlm {
+namespace vlm::platform {
 namespace {
 
 #define REPLACED "\xEF\xBF\xBD"
@@ -13,7 +13,7 @@ struct Row {
     const char* why;
 };
 
-TEST(HarmlessText, ReplacesWhatWouldActInsteadOfShow) {
+TEST(HarmlessTextTest, ReplacesWhatWouldActInsteadOfShow) {
     const Row rows[] = {
         {"", "", "nothing"},
         {"Alice - PIV (9A)~", "Alice - PIV (9A)~", "plain text, up to its last character"},
@@ -42,9 +42,20 @@ TEST(HarmlessText, ReplacesWhatWouldActInsteadOfShow) {
          "a" REPLACED "b", "a byte that is no text"},
         {"a\xE2\x82", "a" REPLACED, "a character cut off at the end"},
         {"\xC0\x8A", REPLACED REPLACED, "a line feed in an overlong form"},
+        {"\xe0\x80\x8a", REPLACED REPLACED REPLACED, "one in an even longer form"},
+        {"\xed\xa0\x80", REPLACED REPLACED REPLACED, "a surrogate"},
+        {"\xf4\x90\x80\x80", REPLACED REPLACED REPLACED REPLACED, "beyond the last character"},
+        {"\u200d\u2010\u2027\u202f\u2065\u206a", "\u200d\u2010\u2027\u202f\u2065\u206a",
+         "the neighbours of those that act"},
     };
     for (const auto& row : rows) EXPECT_EQ(harmlessText(row.text), row.harmless) << row.why;
 }
 
+TEST(HarmlessTextTest, CutsBetweenCharactersAndSaysSo) {
+    EXPECT_EQ(harmlessText("\u00e4\u00e4\u00e4", 2), "\u00e4\u00e4...");
+    EXPECT_EQ(harmlessText("abc", 3), "abc");
+    EXPECT_EQ(harmlessText("a", 0), "...");
+}
+
 }  // namespace
-}  // namespace vlm
+}  // namespace vlm::platform
