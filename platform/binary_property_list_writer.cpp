@@ -1,8 +1,10 @@
 #include <algorithm>
+#include <array>
 #include <bit>
-#include <map>
+#include <cstring>
 
 #include "platform/binary_property_list.h"
+#include "platform/seen_set.h"
 #include "platform/utf.h"
 
 namespace vlm::platform {
@@ -18,204 +20,341 @@ std::size_t widthOf(std::uint64_t number) {
     return number <= 0xFFFFFFFF ? 4 : 8;
 }
 
-// Bytes with what the format puts into them. `Output` is Bytes for the list and std::string for
-// an object that is compared as a whole.
-template <typename Output>
-void putNumber(Output& output, std::uint64_t number, std::size_t width) {
-    for (std::size_t byte = width; byte-- > 0;)
-        output.push_back(static_cast<typename Output::value_type>(
-            static_cast<std::uint8_t>(number >> (byte * 8))));
-}
-
-template <typename Output>
-void putMarker(Output& output, Kind kind, std::uint64_t lowerHalf) {
-    putNumber(output, (static_cast<std::uint64_t>(kind) << 4U) | lowerHalf, 1);
-}
-
-template <typename Output>
-void putInteger(Output& output, std::uint64_t number) {
-    const std::size_t width = widthOf(number);
-    putMarker(output, Kind::Integer, static_cast<std::uint64_t>(std::countr_zero(width)));
-    putNumber(output, number, width);
-}
-
-template <typename Output>
-void putCount(Output& output, Kind kind, std::size_t count) {
-    if (count < kLongCount) return putMarker(output, kind, count);
-    putMarker(output, kind, kLongCount);
-    putInteger(output, count);
-}
-
-// The 16-byte form, of which only the lower half is ever needed: eight bytes are read as signed.
-void putAboveSigned(std::string& output, std::uint64_t number) {
-    putMarker(output, Kind::Integer, 4);
-    putNumber(output, 0, 8);
-    putNumber(output, number, 8);
-}
-
-// The object of a text, ASCII where it is ASCII; none when it is not UTF-8.
-std::optional<std::string> encodeText(const std::string& text) {
-    const auto isAscii = [](char byte) { return static_cast<unsigned char>(byte) < 0x80; };
-    std::string object;
-    if (std::ranges::all_of(text, isAscii)) {
-        putCount(object, Kind::Ascii, text.size());
-        return object + text;
-    }
-    const auto units = utf8ToUtf16(text);
-    if (!units) return std::nullopt;
-    putCount(object, Kind::Utf16, units->size());
-    for (const char16_t unit : *units) putNumber(object, unit, 2);
-    return object;
-}
-
-void putDouble(std::string& output, Kind kind, double value) {
-    putMarker(output, kind, kDateWidth);
-    putNumber(output, std::bit_cast<std::uint64_t>(value), 8);
-}
-
-// The object of a value that is neither text nor a collection.
-std::string encodeScalar(const PropertyList& value) {
-    std::string object;
-    if (const auto boolean = value.boolean()) {
-        putMarker(object, Kind::Constant, *boolean ? kTrue : kFalse);
-    } else if (const auto integer = value.integer()) {
-        putInteger(object, static_cast<std::uint64_t>(*integer));
-    } else if (const auto above = value.unsignedInteger()) {
-        putAboveSigned(object, *above);
-    } else if (const auto real = value.real()) {
-        putDouble(object, Kind::Real, *real);
-    } else if (const auto date = value.date()) {
-        putDouble(object, Kind::Date, date->secondsSince2001);
-    } else if (const auto* bytes = value.bytes()) {
-        putCount(object, Kind::Data, bytes->size());
-        object.append(bytes->begin(), bytes->end());
-    }
-    return object;
-}
-
-class Writer {
+// Writes into memory that is known to be large enough.
+class Cursor {
 public:
-    explicit Writer(const PropertyListLimits& limits) : _limits(limits), _budget(limits) {}
+    explicit Cursor(std::uint8_t* place) : _place(place) {}
 
-    std::optional<Bytes> write(const PropertyList& value) {
-        if (!_budget.takeObjects(1) || !add(value, 0)) return std::nullopt;
-        return serialise();
+    std::uint8_t* place() const { return _place; }
+    void goBackTo(std::uint8_t* place) { _place = place; }
+
+    // Big-endian.
+    void putNumber(std::uint64_t number, std::size_t width) {
+        for (std::size_t byte = width; byte-- > 0; number >>= 8U)
+            _place[byte] = static_cast<std::uint8_t>(number);
+        _place += width;
+    }
+
+    void putMarker(Kind kind, std::uint64_t lowerHalf) {
+        *_place++ = static_cast<std::uint8_t>(static_cast<std::uint64_t>(kind) << 4U | lowerHalf);
+    }
+
+    void putInteger(std::uint64_t number) {
+        const std::size_t width = widthOf(number);
+        putMarker(Kind::Integer, static_cast<std::uint64_t>(std::countr_zero(width)));
+        putNumber(number, width);
+    }
+
+    void putCount(Kind kind, std::size_t count) {
+        if (count < kLongCount) return putMarker(kind, count);
+        putMarker(kind, kLongCount);
+        putInteger(count);
+    }
+
+    void putBytes(const void* bytes, std::size_t size) {
+        if (size > 0) std::memcpy(_place, bytes, size);
+        _place += size;
     }
 
 private:
-    // A scalar, encoded once for all values that are equal to it, or a collection's references.
-    struct Object {
-        const std::string* scalar = nullptr;
-        Kind kind = Kind::Array;
-        std::vector<std::size_t> references;
-    };
+    std::uint8_t* _place;
+};
 
-    // Adds the value with all that it holds and answers its number. Numbers are given on first
-    // sight, a collection's before those of its contents, so the top object is number 0.
-    std::optional<std::size_t> add(const PropertyList& value, std::size_t depth) {
-        if (const auto* array = value.array()) {
-            const auto number = addCollection(Kind::Array, array->size(), depth);
-            return number && addContents(*number, *array, depth + 1) ? number : std::nullopt;
-        }
-        if (const auto* dictionary = value.dictionary()) {
-            const auto number = addCollection(Kind::Dictionary, 2 * dictionary->size(), depth);
-            return number && addContents(*number, *dictionary, depth + 1) ? number : std::nullopt;
-        }
-        if (const auto* text = value.text()) return addText(*text);
-        if (const auto* bytes = value.bytes(); bytes && !_budget.takeBytes(bytes->size()))
-            return std::nullopt;
-        return addScalar(encodeScalar(value));
+// What a marker with a count takes.
+std::size_t countBytes(std::size_t count) {
+    return count < kLongCount ? 1 : 1 + 1 + widthOf(count);
+}
+
+bool isAscii(std::string_view text) {
+    std::uint64_t bits = 0;
+    for (; text.size() >= sizeof bits; text.remove_prefix(sizeof bits)) {
+        std::memcpy(&bits, text.data(), sizeof bits);
+        if ((bits & 0x8080808080808080U) != 0) return false;
+    }
+    return std::ranges::all_of(text,
+                               [](char byte) { return static_cast<unsigned char>(byte) < 0x80; });
+}
+
+// Puts what is neither text nor a collection.
+struct ScalarPutter {
+    Cursor& output;
+
+    void operator()(bool value) const { output.putMarker(Kind::Constant, value ? kTrue : kFalse); }
+    void operator()(std::int64_t value) const {
+        output.putInteger(static_cast<std::uint64_t>(value));
+    }
+    // The 16-byte form, since eight bytes are read as signed.
+    void operator()(std::uint64_t value) const {
+        output.putMarker(Kind::Integer, 4);
+        output.putNumber(0, 8);
+        output.putNumber(value, 8);
+    }
+    void operator()(double value) const { putDouble(Kind::Real, value); }
+    void operator()(PropertyList::Date date) const { putDouble(Kind::Date, date.secondsSince2001); }
+    void operator()(const Bytes& bytes) const {
+        output.putCount(Kind::Data, bytes.size());
+        output.putBytes(bytes.data(), bytes.size());
     }
 
-    std::optional<std::size_t> addCollection(Kind kind, std::size_t references, std::size_t depth) {
-        if (depth == _limits.depth || !_budget.takeObjects(references)) return std::nullopt;
-        _objects.push_back({nullptr, kind, {}});
-        _objects.back().references.reserve(references);
-        return _objects.size() - 1;
+private:
+    void putDouble(Kind kind, double value) const {
+        output.putMarker(kind, kDateWidth);
+        output.putNumber(std::bit_cast<std::uint64_t>(value), 8);
+    }
+};
+
+// ASCII where the text is ASCII; false when it is not UTF-8.
+bool putText(Cursor& output, const std::string& text) {
+    if (isAscii(text)) {
+        output.putCount(Kind::Ascii, text.size());
+        output.putBytes(text.data(), text.size());
+        return true;
+    }
+    const auto units = utf8ToUtf16(text);
+    if (!units) return false;
+    output.putCount(Kind::Utf16, units->size());
+    for (const char16_t unit : *units) output.putNumber(unit, 2);
+    return true;
+}
+
+// The room that a value needs at the most, counted before anything is written: so nothing that is
+// too large is begun, and nothing moves while it is written.
+class Room {
+public:
+    explicit Room(const PropertyListLimits& limits) : _limits(limits), _budget(limits) {}
+
+    // False when the value is not within the limits.
+    bool addTop(const PropertyList& value) { return _budget.takeObjects(1) && add(value, 0); }
+
+    std::size_t scalars = 0;
+    std::size_t sharable = 0;  // of them, texts and bytes
+    std::size_t collections = 0;
+    std::size_t references = 0;
+
+    std::size_t objects() const { return scalars + collections; }
+    std::size_t bytes() const {
+        const std::size_t table = kMagic.size() + _bytes + references * widthOf(objects());
+        return table + objects() * widthOf(table) + kTrailerSize;
     }
 
-    bool addContents(std::size_t number, const PropertyList::Array& array, std::size_t depth) {
-        return std::ranges::all_of(
-            array, [&](const PropertyList& each) { return refer(number, add(each, depth)); });
+private:
+    bool add(const PropertyList& value, std::size_t depth) {
+        return value.visit([&](const auto& held) { return add(held, depth); });
     }
-
-    // All keys come before all values.
-    bool addContents(std::size_t number, const PropertyList::Dictionary& dictionary,
-                     std::size_t depth) {
-        return std::ranges::all_of(
-                   dictionary,
-                   [&](const auto& entry) { return refer(number, addText(entry.first)); }) &&
+    bool add(bool, std::size_t) { return addScalar(1); }
+    bool add(std::int64_t value, std::size_t) {
+        return addScalar(1 + widthOf(static_cast<std::uint64_t>(value)));
+    }
+    bool add(std::uint64_t, std::size_t) { return addScalar(1 + 2 * 8); }
+    bool add(double, std::size_t) { return addScalar(1 + 8); }
+    bool add(PropertyList::Date, std::size_t) { return addScalar(1 + 8); }
+    bool add(const std::string& text, std::size_t) {
+        if (!_budget.takeBytes(text.size())) return false;
+        ++sharable;
+        if (isAscii(text)) return addScalar(countBytes(text.size()) + text.size());
+        // A character of one byte takes two, of two or three bytes two, of four bytes four.
+        return addScalar(countBytes(text.size()) + 2 * text.size());
+    }
+    bool add(const Bytes& bytes, std::size_t) {
+        ++sharable;
+        return _budget.takeBytes(bytes.size()) &&
+               addScalar(countBytes(bytes.size()) + bytes.size());
+    }
+    bool add(const PropertyList::Array& array, std::size_t depth) {
+        return addCollection(array.size(), depth) &&
+               std::ranges::all_of(array,
+                                   [&](const PropertyList& each) { return add(each, depth + 1); });
+    }
+    bool add(const PropertyList::Dictionary& dictionary, std::size_t depth) {
+        return addCollection(2 * dictionary.size(), depth) &&
                std::ranges::all_of(dictionary, [&](const auto& entry) {
-                   return refer(number, add(entry.second, depth));
+                   return add(entry.first, depth) && add(entry.second, depth + 1);
                });
     }
 
-    bool refer(std::size_t from, std::optional<std::size_t> to) {
-        if (to) _objects[from].references.push_back(*to);
-        return to.has_value();
+    bool addScalar(std::size_t bytes) {
+        _bytes += bytes;
+        ++scalars;
+        return true;
     }
-
-    std::optional<std::size_t> addText(const std::string& text) {
-        if (!_budget.takeBytes(text.size())) return std::nullopt;
-        auto object = encodeText(text);
-        if (!object) return std::nullopt;
-        return addScalar(std::move(*object));
-    }
-
-    std::size_t addScalar(std::string object) {
-        const auto [known, isNew] = _scalars.try_emplace(std::move(object), _objects.size());
-        if (isNew) _objects.push_back({&known->first, {}, {}});
-        return known->second;
-    }
-
-    std::optional<Bytes> serialise() const {
-        // Some readers ask that the number of objects and the table's own offset fit as well.
-        const std::size_t referenceWidth = widthOf(_objects.size());
-        Bytes output(kMagic.begin(), kMagic.end());
-        std::vector<std::size_t> offsets;
-        offsets.reserve(_objects.size());
-        for (const Object& object : _objects) {
-            if (output.size() > _limits.bytes) return std::nullopt;
-            offsets.push_back(output.size());
-            put(output, object, referenceWidth);
-        }
-
-        const std::size_t table = output.size();
-        const std::size_t offsetWidth = widthOf(table);
-        for (const std::size_t offset : offsets) putNumber(output, offset, offsetWidth);
-
-        putNumber(output, 0, kTrailerUnused);
-        putNumber(output, offsetWidth, 1);
-        putNumber(output, referenceWidth, 1);
-        putNumber(output, _objects.size(), 8);
-        putNumber(output, 0, 8);
-        putNumber(output, table, 8);
-        if (output.size() > _limits.bytes) return std::nullopt;
-        return output;
-    }
-
-    static void put(Bytes& output, const Object& object, std::size_t referenceWidth) {
-        if (object.scalar) {
-            output.insert(output.end(), object.scalar->begin(), object.scalar->end());
-            return;
-        }
-        const std::size_t count = object.references.size();
-        putCount(output, object.kind, object.kind == Kind::Dictionary ? count / 2 : count);
-        for (const std::size_t reference : object.references)
-            putNumber(output, reference, referenceWidth);
+    bool addCollection(std::size_t size, std::size_t depth) {
+        if (depth == _limits.depth || !_budget.takeObjects(size)) return false;
+        _bytes += countBytes(size);
+        ++collections;
+        references += size;
+        return true;
     }
 
     const PropertyListLimits& _limits;
     Budget _budget;
-    std::vector<Object> _objects;
-    std::map<std::string, std::size_t> _scalars;  // by encoding; objects point at its keys
+    std::size_t _bytes = 0;  // of scalars and of counts
+};
+
+// Numbers the values on first sight, a collection before its contents, so that the top object is
+// number 0. Scalars are written at once; collections behind them, since how wide a reference is
+// depends on how many objects there are in the end.
+class Writer {
+public:
+    explicit Writer(const Room& room)
+        : _list(room.bytes()),
+          _output(_list.data()),
+          _seen(room.sharable),
+          _references(room.references) {
+        _offsets.reserve(room.objects());
+        _collections.reserve(room.collections);
+    }
+
+    // None when a text is not UTF-8, or the list takes more bytes than these.
+    std::optional<Bytes> write(const PropertyList& value, std::size_t mostBytes) {
+        _output.putBytes(kMagic.data(), kMagic.size());
+        if (!add(value)) return std::nullopt;
+        putCollections();
+        putEnd();
+        _list.resize(used());
+        if (_list.size() > mostBytes) return std::nullopt;
+        return std::move(_list);
+    }
+
+private:
+    using Number = std::uint32_t;
+
+    struct Collection {
+        Number number = 0;
+        Kind kind = Kind::Array;
+        std::size_t begin = 0;  // in _references
+        std::size_t size = 0;
+    };
+
+    std::size_t used() const { return static_cast<std::size_t>(_output.place() - _list.data()); }
+
+    std::optional<Number> add(const PropertyList& value) {
+        return value.visit([this](const auto& held) { return add(held); });
+    }
+
+    // Numbers and dates each get an object: it is hardly larger than what shares it, and much
+    // faster made than looked for.
+    template <typename Scalar>
+    std::optional<Number> add(const Scalar& scalar) {
+        const Number number = addObject();
+        ScalarPutter{_output}(scalar);
+        return number;
+    }
+
+    std::optional<Number> add(const Bytes& bytes) {
+        std::uint8_t* const begin = _output.place();
+        ScalarPutter{_output}(bytes);
+        return known(begin);
+    }
+
+    // A list may hold very many of these, and there are only two.
+    std::optional<Number> add(bool value) {
+        auto& number = _booleans[value ? 1 : 0];
+        if (!number) {
+            number = addObject();
+            ScalarPutter{_output}(value);
+        }
+        return number;
+    }
+
+    std::optional<Number> add(const std::string& text) {
+        std::uint8_t* const begin = _output.place();
+        if (!putText(_output, text)) return std::nullopt;
+        return known(begin);
+    }
+
+    std::optional<Number> add(const PropertyList::Array& array) {
+        const Collection self = addCollection(Kind::Array, array.size());
+        std::size_t place = self.begin;
+        for (const PropertyList& each : array)
+            if (!refer(place++, add(each))) return std::nullopt;
+        return self.number;
+    }
+
+    // All keys come before all values.
+    std::optional<Number> add(const PropertyList::Dictionary& dictionary) {
+        const Collection self = addCollection(Kind::Dictionary, 2 * dictionary.size());
+        std::size_t place = self.begin;
+        for (const auto& entry : dictionary)
+            if (!refer(place++, add(entry.first))) return std::nullopt;
+        for (const auto& entry : dictionary)
+            if (!refer(place++, add(entry.second))) return std::nullopt;
+        return self.number;
+    }
+
+    // One that begins where writing goes on.
+    Number addObject() {
+        _offsets.push_back(used());
+        return static_cast<Number>(_offsets.size() - 1);
+    }
+
+    Collection addCollection(Kind kind, std::size_t size) {
+        _collections.push_back({addObject(), kind, _referencesUsed, size});
+        _referencesUsed += size;
+        return _collections.back();
+    }
+
+    bool refer(std::size_t place, std::optional<Number> to) {
+        if (to) _references[place] = *to;
+        return to.has_value();
+    }
+
+    // The number of the text or the bytes that were written last; taken back when it was there
+    // before. Each says how long it is, so one that begins with all of another is equal to it.
+    Number known(std::uint8_t* begin) {
+        const std::span scalar(begin, static_cast<std::size_t>(_output.place() - begin));
+        const auto number = static_cast<Number>(_offsets.size());
+        const Number first = _seen.findOrAdd(scalar, number, [&](Number other) {
+            return std::memcmp(_list.data() + _offsets[other], begin, scalar.size()) == 0;
+        });
+        if (first == number)
+            _offsets.push_back(static_cast<std::size_t>(begin - _list.data()));
+        else
+            _output.goBackTo(begin);
+        return first;
+    }
+
+    // Some readers ask that the number of objects and the table's own offset fit as well.
+    std::size_t referenceWidth() const { return widthOf(_offsets.size()); }
+
+    void putCollections() {
+        const std::size_t width = referenceWidth();
+        for (const auto& [number, kind, begin, size] : _collections) {
+            _offsets[number] = used();
+            _output.putCount(kind, kind == Kind::Dictionary ? size / 2 : size);
+            for (const Number reference : std::span(_references).subspan(begin, size))
+                _output.putNumber(reference, width);
+        }
+    }
+
+    void putEnd() {
+        const std::size_t table = used();
+        const std::size_t width = widthOf(table);
+        for (const std::size_t offset : _offsets) _output.putNumber(offset, width);
+        _output.putNumber(0, kTrailerUnused);
+        _output.putNumber(width, 1);
+        _output.putNumber(referenceWidth(), 1);
+        _output.putNumber(_offsets.size(), 8);
+        _output.putNumber(0, 8);
+        _output.putNumber(table, 8);
+    }
+
+    Bytes _list;
+    Cursor _output;                     // in _list
+    SeenSet _seen;                      // of texts and bytes, by number
+    std::vector<std::size_t> _offsets;  // by number
+    std::array<std::optional<Number>, 2> _booleans;
+    std::vector<Collection> _collections;
+    std::vector<Number> _references;
+    std::size_t _referencesUsed = 0;
 };
 
 }  // namespace
 
 std::optional<Bytes> writeBinaryPropertyList(const PropertyList& value,
                                              const PropertyListLimits& limits) {
-    return Writer(limits).write(value);
+    Room room(limits);
+    if (!room.addTop(value)) return std::nullopt;
+    return Writer(room).write(value, limits.bytes);
 }
 
 }  // namespace vlm::platform

@@ -96,6 +96,12 @@ public:
     const Array* array() const;
     const Dictionary* dictionary() const;
 
+    // Calls the visitor with the value as the type that it is held as, and answers what that does.
+    template <typename Visitor>
+    decltype(auto) visit(Visitor&& visitor) const {
+        return std::visit(std::forward<Visitor>(visitor), _value);
+    }
+
     // The value in a form for people and logs, on one line.
     std::string describe() const;
 

@@ -1,0 +1,65 @@
+#include "bench/interleaved.h"
+
+#include <time.h>
+
+#include <algorithm>
+#include <cstdio>
+
+namespace vlm::bench {
+
+using Seconds = std::chrono::duration<double>;
+
+namespace {
+
+Seconds processorTime() {
+    timespec time{};
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
+    return Seconds(static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9);
+}
+
+}  // namespace
+
+std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t turns) {
+    std::vector<std::vector<Seconds>> times(pieces.size());
+    for (std::size_t turn = 0; turn < turns + 1; ++turn) {
+        for (std::size_t i = 0; i < pieces.size(); ++i) {
+            const Seconds start = processorTime();
+            for (std::size_t n = 0; n < pieces[i].times; ++n) pieces[i].run();
+            const Seconds time = processorTime() - start;
+            const bool warmsUp = turn == 0;
+            if (!warmsUp) times[i].push_back(time / static_cast<double>(pieces[i].times));
+        }
+    }
+    std::vector<Seconds> medians;
+    for (auto& each : times) {
+        const auto middle = each.begin() + static_cast<std::ptrdiff_t>(each.size() / 2);
+        std::ranges::nth_element(each, middle);
+        medians.push_back(*middle);
+    }
+    return medians;
+}
+
+std::string shown(Seconds time) {
+    const char* unit = "s";
+    double number = time.count();
+    for (const char* smaller : {"ms", "us", "ns"}) {
+        if (number >= 1) break;
+        number *= 1000;
+        unit = smaller;
+    }
+    char text[32];
+    std::snprintf(text, sizeof text, "%.3g %s", number, unit);
+    return text;
+}
+
+bool report(const std::string& figure, Seconds time, const std::string& yardstick,
+            Seconds yardstickTime, double goal, const std::string& remark) {
+    const double ratio = time / yardstickTime;
+    std::printf("%-44s %9s | %-34s %9s | %5.2fx, goal %.2fx %s%s%s\n", figure.c_str(),
+                shown(time).c_str(), yardstick.c_str(), shown(yardstickTime).c_str(), ratio, goal,
+                ratio <= goal ? "reached" : "MISSED", remark.empty() ? "" : " | ", remark.c_str());
+    std::fflush(stdout);
+    return ratio <= goal;
+}
+
+}  // namespace vlm::bench

@@ -1,0 +1,80 @@
+// SeenSet: which of many pieces of bytes came before. A piece is known by a number that its owner
+// gives it; the set keeps no bytes.
+//
+// Pieces are told apart by a hash with a secret of this process in it, so that whoever makes the
+// input cannot choose pieces that all meet in one place.
+//
+// Threads: a value. Errors: numbers go up to kMostPieces.
+
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <cstring>
+#include <span>
+#include <vector>
+
+namespace vlm::platform {
+
+class SeenSet {
+public:
+    static constexpr std::uint32_t kMostPieces = 0xFFFFFFFE;
+
+    explicit SeenSet(std::size_t expected);
+
+    // The number of a piece in the set with the same bytes; else puts this one in under its number,
+    // and answers that. isSame(number) answers whether a piece in the set has the same bytes.
+    template <typename IsSame>
+    std::uint32_t findOrAdd(std::span<const std::uint8_t> bytes, std::uint32_t number,
+                            IsSame isSame) {
+        if (2 * _used >= _slots.size()) grow();
+        const auto hash = static_cast<std::uint32_t>(hashOf(bytes));
+        for (std::size_t at = hash & _mask;; at = (at + 1) & _mask) {
+            Slot& slot = _slots[at];
+            if (slot.number == kFree) {
+                slot = {hash, number};
+                ++_used;
+                return number;
+            }
+            if (slot.hash == hash && isSame(slot.number)) return slot.number;
+        }
+    }
+
+private:
+    static constexpr std::uint32_t kFree = 0xFFFFFFFF;
+    struct Slot {
+        std::uint32_t hash = 0;
+        std::uint32_t number = kFree;
+    };
+
+    // Both halves of the product, folded into one: every bit of the input reaches every bit of it.
+    static std::uint64_t folded(std::uint64_t left, std::uint64_t right) {
+        __extension__ using Wide = unsigned __int128;
+        const Wide product = Wide{left} * right;
+        return static_cast<std::uint64_t>(product) ^ static_cast<std::uint64_t>(product >> 64U);
+    }
+
+    std::uint64_t hashOf(std::span<const std::uint8_t> bytes) const {
+        std::uint64_t hash = _secret[0] ^ bytes.size();
+        std::uint64_t piece = 0;
+        for (; bytes.size() > sizeof piece; bytes = bytes.subspan(sizeof piece)) {
+            std::memcpy(&piece, bytes.data(), sizeof piece);
+            hash = folded(hash ^ piece, _secret[1]);
+        }
+        piece = 0;
+        if (!bytes.empty()) std::memcpy(&piece, bytes.data(), bytes.size());
+        return folded(hash ^ piece, _secret[2]);
+    }
+
+    void grow();
+
+    using Secret = std::array<std::uint64_t, 3>;
+    static const Secret& secretOfThisProcess();
+
+    Secret _secret;
+    std::vector<Slot> _slots;
+    std::size_t _mask = 0;
+    std::size_t _used = 0;
+};
+
+}  // namespace vlm::platform
