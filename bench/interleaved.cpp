@@ -11,21 +11,21 @@ using Seconds = std::chrono::duration<double>;
 
 namespace {
 
-Seconds processorTime() {
+Seconds now(Clock clock) {
     timespec time{};
-    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
+    clock_gettime(clock == Clock::Processor ? CLOCK_THREAD_CPUTIME_ID : CLOCK_MONOTONIC, &time);
     return Seconds(static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9);
 }
 
 }  // namespace
 
-std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t turns) {
+std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t turns, Clock clock) {
     std::vector<std::vector<Seconds>> times(pieces.size());
     for (std::size_t turn = 0; turn < turns + 1; ++turn) {
         for (std::size_t i = 0; i < pieces.size(); ++i) {
-            const Seconds start = processorTime();
+            const Seconds start = now(clock);
             for (std::size_t n = 0; n < pieces[i].times; ++n) pieces[i].run();
-            const Seconds time = processorTime() - start;
+            const Seconds time = now(clock) - start;
             const bool warmsUp = turn == 0;
             if (!warmsUp) times[i].push_back(time / static_cast<double>(pieces[i].times));
         }

@@ -1,6 +1,5 @@
 // Measures pieces of work side by side. Machines are noisy, and speed up and slow down over
-// seconds; so the pieces take turns, and what counts is the ratio of their medians. The time is the
-// processor's, so that other programs on a busy machine do not count.
+// seconds; so the pieces take turns, and what counts is the ratio of their medians.
 //
 // Threads: one.
 
@@ -19,9 +18,14 @@ struct Work {
     std::size_t times = 1;  // in one turn, so that a turn is long enough for the clock
 };
 
+// Processor time leaves out what other programs do on a busy machine, but counts only what this
+// thread does itself.
+enum class Clock { Processor, Wall };
+
 // The median time of one run of each piece, after that many turns.
 std::vector<std::chrono::duration<double>> medianTimes(const std::vector<Work>& pieces,
-                                                       std::size_t turns);
+                                                       std::size_t turns,
+                                                       Clock clock = Clock::Processor);
 
 // Keeps the compiler from leaving out work whose result nobody looks at.
 template <typename Value>

@@ -13,7 +13,11 @@ std::string hexadecimal(const Bytes& bytes) {
     return text;
 }
 
-std::string toText(const Bytes& bytes) { return "<" + hexadecimal(bytes) + ">"; }
+std::string toText(const Bytes& bytes) {
+    std::string text = "<";
+    text += hexadecimal(bytes);
+    return text += '>';
+}
 
 std::string toText(const Error& error) {
     std::string text = error.domain + " error " + std::to_string(error.code);

@@ -1,0 +1,2 @@
+// The yardstick of commands: what any C++ program pays for.
+int main() { return 0; }
