@@ -24,7 +24,7 @@ std::string_view kindOf(const PropertyList& value) {
     if (value.date()) return "a date";
     if (value.array()) return "an array";
     if (value.dictionary()) return "a dictionary";
-    return "a number";
+    return value.boolean() ? "a boolean" : "a number";
 }
 
 bool isNumber(const PropertyList& value) {
