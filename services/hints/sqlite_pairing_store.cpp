@@ -129,8 +129,9 @@ Outcome<std::unique_ptr<SqlitePairingStore>> SqlitePairingStore::openToRead(
     // A pipe in the file's place must not make this wait.
     std::error_code error;
     const auto file = std::filesystem::status(path, error);
-    if (!std::filesystem::exists(file))
-        return cannotOpen(path, error ? error.message() : "there is no such file");
+    if (file.type() == std::filesystem::file_type::not_found)
+        return cannotOpen(path, "there is none; the hints service makes it when it first starts");
+    if (error) return cannotOpen(path, error.message());
     if (!std::filesystem::is_regular_file(file)) return cannotOpen(path, "it is no regular file");
     try {
         SQLite::Database database(path, SQLite::OPEN_READONLY, kPatienceMilliseconds);

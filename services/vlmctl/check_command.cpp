@@ -69,14 +69,15 @@ Json jsonOf(const CheckReport& report, const std::string& file) {
 
 int checkFile(const Arguments& arguments, Output& output) {
     const auto& file = arguments.operands.front();
-    const std::size_t most = platform::PropertyListLimits().bytes;
+    const auto role = roleOf(file);
+    const auto most = mostBytes(role);
     const auto content = file == "-" ? readStandardInput(most) : readFile(file, most);
     if (!content.bytes) {
         output.complain(text("{} cannot be read: {}", file, content.problem));
         return kExitUsage;
     }
 
-    const auto report = checkPropertyList(*content.bytes, roleOf(file));
+    const auto report = checkPropertyList(*content.bytes, role);
     if (arguments.json) {
         output.print(jsonOf(report, file).text());
     } else {

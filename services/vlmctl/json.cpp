@@ -90,9 +90,9 @@ void Json::write(std::string& text, std::size_t depth) const {
                       [&](const Json& element) { element.write(text, depth + 1); });
     } else if (const auto* object = std::get_if<Object>(&_value)) {
         writeElements(text, *object, "{}", depth, [&](const Member& member) {
-            writeText(text, member.name);
+            writeText(text, member.first);
             text += ": ";
-            member.value.write(text, depth + 1);
+            member.second.write(text, depth + 1);
         });
     } else {
         text += "null";

@@ -18,7 +18,7 @@ namespace vlm::control {
 
 class Json {
 public:
-    struct Member;
+    using Member = std::pair<std::string, Json>;
     using Array = std::vector<Json>;
     using Object = std::vector<Member>;
 
@@ -42,11 +42,6 @@ private:
     void write(std::string& text, std::size_t depth) const;
 
     std::variant<std::monostate, bool, std::int64_t, std::string, Array, Object> _value;
-};
-
-struct Json::Member {
-    std::string name;
-    Json value;
 };
 
 }  // namespace vlm::control

@@ -7,7 +7,6 @@
 #include <vector>
 
 #include "platform/text.h"
-#include "services/vlmctl/configuration_file.h"
 
 namespace vlm::control {
 

@@ -8,6 +8,9 @@
 
 namespace vlm::control {
 
+// The entry of the configuration file that is read, of any type.
+inline constexpr std::string_view kAttributeMapping = "AttributeMapping";
+
 // The setting with exactly this key; null when there is none.
 const KnownSetting* findSetting(std::string_view key);
 

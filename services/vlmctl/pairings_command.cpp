@@ -30,8 +30,9 @@ using Pairings = std::vector<Pairing>;
 Outcome<Pairings> askService(const std::string& account) {
     const auto hashes = VLCopyLegacyBindings(String(account), /*flag=*/false);
     if (!hashes)
-        return Refusal{0, text("the hints service does not tell the pairings of {}; \"journalctl "
-                               "SUBSYSTEM=org.vlm.token\" says why. Those of another account are "
+        return Refusal{0, text("the hints service gave no answer about the pairings of {}; "
+                               "\"systemctl status vlmhintsd\" and \"journalctl "
+                               "SUBSYSTEM=org.vlm.token\" say why. Those of another account are "
                                "for root only",
                                account)};
     Pairings pairings;

@@ -1,12 +1,12 @@
 #include "services/vlmctl/property_list_check.h"
 
 #include <algorithm>
-#include <limits>
 
+#include "platform/linux/preferences_record.h"
 #include "platform/text.h"
-#include "services/vlmctl/configuration_file.h"
 #include "services/vlmctl/known_key.h"
 #include "settings/known_settings.h"
+#include "settings/smartcard_configuration.h"
 
 namespace vlm::control {
 
@@ -31,8 +31,17 @@ bool isNumber(const PropertyList& value) {
     return value.integer() || value.unsignedInteger() || value.real();
 }
 
+bool isWide(const PropertyList& value) {
+    if (const auto integer = value.integer())
+        return *integer != static_cast<std::int32_t>(*integer);
+    return value.unsignedInteger().has_value();
+}
+
 void checkSetting(const std::string& key, const PropertyList& value,
                   std::vector<Finding>& findings) {
+    if (isWide(value))
+        findings.push_back(warning(
+            text("\"{}\" does not fit in 32 bits, and only the low ones of it count", key)));
     if (value.boolean() || isNumber(value)) return;
     findings.push_back(problem(
         text("\"{}\" is {}, and counts as absent: the login reads a boolean or a number only", key,
@@ -51,13 +60,13 @@ void checkEntry(const std::string& key, const PropertyList& value, FileRole role
     if (key == kAttributeMapping) {
         if (role == FileRole::Settings)
             findings.push_back(
-                warning(text("\"{}\" is read from {} only", key, kConfigurationFile)));
+                warning(text("\"{}\" is read from {} only", key, kSmartcardConfiguration)));
     } else if (findSetting(key)) {
         checkSetting(key, value, findings);
         if (role == FileRole::Configuration)
             findings.push_back(
                 warning(text("\"{}\" is a setting, and is not read from {}; \"vlmctl set\" sets it",
-                             key, kConfigurationFile)));
+                             key, kSmartcardConfiguration)));
     } else {
         checkUnknown(key, findings);
     }
@@ -71,7 +80,7 @@ std::string_view nameOf(std::string_view path) {
 }  // namespace
 
 FileRole roleOf(std::string_view path) {
-    if (nameOf(path) == nameOf(kConfigurationFile)) return FileRole::Configuration;
+    if (nameOf(path) == nameOf(kSmartcardConfiguration)) return FileRole::Configuration;
     if (nameOf(path) == text("{}.plist", kSmartcardDomain)) return FileRole::Settings;
     return FileRole::Unknown;
 }
@@ -80,8 +89,13 @@ bool CheckReport::hasProblems() const {
     return !std::ranges::all_of(findings, &Finding::isWarning);
 }
 
+std::size_t mostBytes(FileRole role) {
+    return role == FileRole::Configuration ? kLargestConfiguration : platform::kLargestRecord;
+}
+
 CheckReport checkPropertyList(std::span<const std::uint8_t> data, FileRole role) {
-    const auto examined = platform::examinePropertyList(data);
+    const auto examined = platform::examinePropertyList(
+        data, role == FileRole::Configuration ? kConfigurationLimits : platform::kRecordLimits);
     CheckReport report{.format = examined.format, .keys = 0, .findings = {}};
     if (!examined.value) {
         report.findings.push_back({false, examined.problem, examined.line, examined.column});

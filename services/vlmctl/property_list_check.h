@@ -26,6 +26,9 @@ enum class FileRole {
 // By the file's name; the folder does not matter, so that a draft can be checked anywhere.
 FileRole roleOf(std::string_view path);
 
+// How large such a file may be for a login to read it.
+std::size_t mostBytes(FileRole role);
+
 struct Finding {
     bool isWarning = false;  // the login reads the file all the same
     std::string text;
@@ -41,6 +44,7 @@ struct CheckReport {
     bool hasProblems() const;
 };
 
+// Reads with the limits of the login.
 CheckReport checkPropertyList(std::span<const std::uint8_t> data, FileRole role);
 
 }  // namespace vlm::control

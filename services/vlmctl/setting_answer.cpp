@@ -2,8 +2,9 @@
 
 #include "hints/hints_client.h"
 #include "platform/text.h"
-#include "services/vlmctl/configuration_file.h"
-#include "settings/known_settings.h"
+#include "services/vlmctl/known_key.h"
+#include "services/vlmctl/read_file.h"
+#include "settings/smartcard_configuration.h"
 #include "settings/smartcard_settings.h"
 
 namespace vlm::control {
@@ -28,13 +29,21 @@ std::string nameOf(SmartcardSettingOrigin origin) {
     return "unknown";
 }
 
+bool configurationMapsUsers() {
+    const auto content = readFile(kSmartcardConfiguration, kLargestConfiguration);
+    const auto list = content.bytes
+                          ? platform::readPropertyList(*content.bytes, kConfigurationLimits)
+                          : std::nullopt;
+    return list && list->dictionary() && list->dictionary()->contains(kAttributeMapping);
+}
+
 // Only a machine that enforces cards and lets some in without asks who the user is.
 std::string reasonOf(const std::string& user, std::int32_t value) {
     if (VLGetSmartcardSetting(String(kUnmappedUsers)) == 0)
         return text("{} is off", kUnmappedUsers);
     if (value == 0) return text("{} is not paired and {} is on", user, kUnmappedUsers);
     if (configurationMapsUsers())
-        return text("{} in {} maps users to cards", kAttributeMapping, kConfigurationFile);
+        return text("{} in {} maps users to cards", kAttributeMapping, kSmartcardConfiguration);
     const auto pairings = VLCopyLegacyBindings(String(user), /*flag=*/false);
     if (!pairings) return text("the hints service gave no answer, so {} counts as paired", user);
     return text("{} is paired", user);

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "bind/bind_operation.h"
@@ -37,7 +38,7 @@ struct Identity {
     std::string accounts;  // whom it is paired with, as far as the caller may know
     std::string hash;
 
-    auto operator<=>(const Identity&) const = default;
+    auto rank() const { return std::tie(state, name, hash); }
 };
 
 template <typename Map, typename Key>
@@ -90,7 +91,7 @@ std::vector<Token> tokensOf(const TokenInfo& info) {
         if (hashes != info.hashesByToken.end())
             for (const auto& hash : hashes->second)
                 token.identities.push_back(identityOf(info, hash));
-        std::ranges::sort(token.identities);
+        std::ranges::sort(token.identities, {}, &Identity::rank);
         tokens.push_back(std::move(token));
     }
     return tokens;
@@ -132,8 +133,8 @@ int listTokens(const Arguments& arguments, Output& output) {
     const auto record = BindOperation::init()->tokenData(std::nullopt);
     if (!record) {
         output.complain(
-            "the hints service does not tell about cards; \"journalctl SUBSYSTEM=org.vlm.token\" "
-            "says why");
+            "the hints service gave no answer about cards; \"systemctl status vlmhintsd\" and "
+            "\"journalctl SUBSYSTEM=org.vlm.token\" say why");
         return kExitFailure;
     }
     const auto tokens = tokensOf(TokenInfo(*record));

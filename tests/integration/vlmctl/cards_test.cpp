@@ -6,7 +6,6 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -25,14 +24,22 @@ constexpr const char* kTime = "[0-9]+-[0-9]+-[0-9]+T[0-9]+:[0-9]+:[0-9]+Z";
 
 class ControlOfCards : public ::testing::Test {
 protected:
-    void startWithCard() {
-        machine.machine.cards.add("Card", {identity("p256", "Alice Example")});
+    // Two cards, with one identity each: a card is paired with one account.
+    void startWithCards() {
+        machine.machine.cards.add("Blue", {identity("p256", "Alice Example")});
+        machine.machine.cards.add("Red", {identity("p256", "Bob Example")});
         machine.machine.startService();
         const auto listing = machine.machine.vlmbind({"-i"}).output;
-        ASSERT_NE(listing.find('\t'), std::string::npos) << listing;
-        hash = listing.substr(listing.find('\t') - 64, 64);
+        alice = hashOf("Alice Example", listing);
+        bob = hashOf("Bob Example", listing);
+        ASSERT_NE(alice, "") << listing;
+        ASSERT_NE(bob, "") << listing;
     }
-    void pair(const std::string& account) {
+    static std::string hashOf(const std::string& name, const std::string& listing) {
+        const auto at = listing.find("\t" + name);
+        return at == std::string::npos || at < 64 ? "" : listing.substr(at - 64, 64);
+    }
+    void pair(const std::string& account, const std::string& hash) {
         const auto paired = machine.machine.vlmbind({"-p", "-u", account, "-h", hash});
         ASSERT_EQ(paired.status, 0) << paired.output;
     }
@@ -43,54 +50,58 @@ protected:
     }
 
     ControlMachine machine;
-    std::string hash;
+    std::string alice;  // the public-key hashes
+    std::string bob;
 };
 
 TEST_F(ControlOfCards, ListsTheSameAsTheTool) {
-    startWithCard();
+    startWithCards();
 
     const auto listed = machine.vlmctl({"tokens", "--no-legend"});
 
     EXPECT_EQ(listed.status, 0) << listed.errors;
     EXPECT_THAT(listed.output,
-                testing::StartsWith("Card  Alice Example  unpaired  -  " + hash + "  pkcs11:"));
+                HasSubstr("Blue  Alice Example  unpaired  -  " + alice + "  pkcs11:"));
+    EXPECT_THAT(listed.output, HasSubstr("Red   Bob Example    unpaired  -  " + bob + "  pkcs11:"));
 }
 
 TEST_F(ControlOfCards, ShowsAPairingWithItsCardAndInTheDatabase) {
     if (getuid() != 0) GTEST_SKIP() << "pairing needs root";
-    startWithCard();
-    pair("root");
-    pair("nobody");
+    startWithCards();
+    pair("root", alice);
+    pair("nobody", bob);
 
     EXPECT_THAT(machine.vlmctl({"tokens", "--no-legend"}).output,
-                HasSubstr("Card  Alice Example  used for login  nobody, root  " + hash));
+                HasSubstr("Blue  Alice Example  used for login  root    " + alice));
     EXPECT_THAT(machine.vlmctl({"pairings", "--database", database()}).output,
-                MatchesRegex("ACCOUNT  PUBLIC KEY HASH +PAIRED AT\nnobody   " + hash + "  " +
-                             kTime + "\nroot     " + hash + "  " + kTime + "\n"));
+                MatchesRegex("ACCOUNT  PUBLIC KEY HASH +PAIRED AT\nnobody   " + bob + "  " + kTime +
+                             "\nroot     " + alice + "  " + kTime + "\n"));
     EXPECT_THAT(
         machine.vlmctl({"pairings", "--database", database(), "--user", "root", "--no-legend"})
             .output,
-        MatchesRegex("root  " + hash + "  " + kTime + "\n"));
+        MatchesRegex("root  " + alice + "  " + kTime + "\n"));
     EXPECT_EQ(machine.vlmctl({"pairings", "--user", "root", "--no-legend"}).output,
-              "root  " + hash + "  -\n");
+              "root  " + alice + "  -\n");
 }
 
 TEST_F(ControlOfCards, TellsAnOrdinaryUserTheOwnPairingsOnly) {
     if (getuid() != 0) GTEST_SKIP() << "only root can run the tool as another user";
-    startWithCard();
-    pair("root");
-    pair("nobody");
+    startWithCards();
+    pair("root", alice);
+    pair("nobody", bob);
 
     const auto own = machine.vlmctl({"pairings", "--no-legend"}, kOrdinaryUser);
     const auto other = machine.vlmctl({"pairings", "--user", "root"}, kOrdinaryUser);
-    const auto database =
-        machine.vlmctl({"pairings", "--database", this->database()}, kOrdinaryUser);
+    const auto file = machine.vlmctl({"pairings", "--database", database()}, kOrdinaryUser);
+    const auto cards = machine.vlmctl({"tokens"}, kOrdinaryUser);
 
-    EXPECT_EQ(own.output, "nobody  " + hash + "  -\n");
+    EXPECT_EQ(own.output, "nobody  " + bob + "  -\n");
     EXPECT_EQ(other.status, 1);
     EXPECT_THAT(other.errors, HasSubstr("Those of another account are for root only"));
-    EXPECT_EQ(database.status, 1);
-    EXPECT_EQ(database.output, "");
+    EXPECT_EQ(file.status, 1);
+    EXPECT_EQ(file.output, "");
+    EXPECT_THAT(cards.output, HasSubstr("Alice Example  paired          another account"));
+    EXPECT_THAT(cards.output, HasSubstr("Bob Example    used for login  nobody"));
 }
 
 TEST_F(ControlOfCards, SaysThatTheServiceIsNotThere) {
@@ -99,15 +110,16 @@ TEST_F(ControlOfCards, SaysThatTheServiceIsNotThere) {
 
     EXPECT_EQ(tokens.status, 1);
     EXPECT_EQ(tokens.output, "");
-    EXPECT_THAT(tokens.errors, HasSubstr("vlmctl: the hints service does not tell about cards"));
+    EXPECT_THAT(tokens.errors, HasSubstr("vlmctl: the hints service gave no answer about cards"));
     EXPECT_EQ(pairings.status, 1);
-    EXPECT_THAT(pairings.errors, HasSubstr("vlmctl: the hints service does not tell the pairings"));
+    EXPECT_THAT(pairings.errors,
+                HasSubstr("vlmctl: the hints service gave no answer about the pairings"));
 }
 
 // Databases that are no running service's.
 class ControlOfDatabases : public ControlOfCards {
 protected:
-    Ended read(const std::string& file) { return machine.vlmctl({"pairings", "--database", file}); }
+    Ended read(const std::string& path) { return machine.vlmctl({"pairings", "--database", path}); }
     static std::string contentOf(const std::string& path) {
         std::ifstream file(path, std::ios::binary);
         return {std::istreambuf_iterator<char>(file), {}};
@@ -121,24 +133,24 @@ TEST_F(ControlOfDatabases, NeverMakesOne) {
     const auto refused = read(file);
 
     EXPECT_EQ(refused.status, 1);
-    EXPECT_THAT(refused.errors, HasSubstr(file + " cannot be used: "));
+    EXPECT_THAT(refused.errors, HasSubstr(file + " cannot be used: there is none"));
     EXPECT_TRUE(std::filesystem::is_empty(folder.path()));
 }
 
 TEST_F(ControlOfDatabases, ReadsOneWhoseServiceHasEndedAndLeavesItAsItWas) {
     if (getuid() != 0) GTEST_SKIP() << "pairing needs root";
-    startWithCard();
-    pair("root");
+    startWithCards();
+    pair("root", alice);
     machine.machine.stopService();
     const auto before = contentOf(database());
 
     const auto listed = read(database());
 
     EXPECT_EQ(listed.status, 0) << listed.errors;
-    EXPECT_THAT(listed.output, HasSubstr("root     " + hash));
+    EXPECT_THAT(listed.output, HasSubstr("root     " + alice));
     EXPECT_EQ(contentOf(database()), before);
     machine.machine.startService();
-    EXPECT_THAT(read(database()).output, HasSubstr("root     " + hash));
+    EXPECT_THAT(read(database()).output, HasSubstr("root     " + alice));
 }
 
 TEST_F(ControlOfDatabases, RefusesOnesThatItDoesNotUnderstandAndChangesNothing) {

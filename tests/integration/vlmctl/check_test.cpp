@@ -132,7 +132,7 @@ TEST_F(ControlCheck, RefusesAFileThatIsTooLargeUnread) {
     const auto refused = check(file);
 
     EXPECT_EQ(refused.status, 2);
-    EXPECT_THAT(refused.errors, HasSubstr("it has more than 67108864 bytes"));
+    EXPECT_THAT(refused.errors, HasSubstr("it has more than 4194304 bytes"));
 }
 
 TEST_F(ControlCheck, FailsWhenWhatItSaysIsLost) {

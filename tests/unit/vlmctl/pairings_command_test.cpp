@@ -45,7 +45,7 @@ TEST_F(PairingsCommand, SaysThatTheServiceIsNotThere) {
 
     EXPECT_EQ(run.status, 1);
     EXPECT_EQ(run.output, "");
-    EXPECT_THAT(run.complaints, HasSubstr("does not tell the pairings of alice"));
+    EXPECT_THAT(run.complaints, HasSubstr("no answer about the pairings of alice"));
 }
 
 TEST_F(PairingsCommand, PassesOverWhatIsNoHash) {

@@ -3,6 +3,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <limits>
+
 namespace vlm::control {
 namespace {
 
@@ -25,7 +27,6 @@ TEST(PropertyListCheck, TakesABooleanOrANumberForASetting) {
         {"a boolean", true, ""},
         {"a number", 5, ""},
         {"a number below zero", -1, ""},
-        {"a number above the signed range", std::uint64_t{1} << 63U, ""},
         {"a real", 1.5, ""},
         {"text", "1", "is text, and counts as absent"},
         {"data", platform::Bytes{1}, "is data, and counts as absent"},
@@ -43,6 +44,21 @@ TEST(PropertyListCheck, TakesABooleanOrANumberForASetting) {
         if (*problem) {
             EXPECT_THAT(report.findings[0].text, HasSubstr(problem));
         }
+    }
+}
+
+TEST(PropertyListCheck, WarnsOfANumberThatIsCut) {
+    const std::int64_t most = std::numeric_limits<std::int32_t>::max();
+    EXPECT_TRUE(check(Dictionary{{"UserPairing", most}}).findings.empty());
+    EXPECT_TRUE(check(Dictionary{{"UserPairing", -most - 1}}).findings.empty());
+
+    for (const PropertyList& wide :
+         {PropertyList(most + 1), PropertyList(-most - 2), PropertyList(std::uint64_t{1} << 63U)}) {
+        const auto report = check(Dictionary{{"UserPairing", wide}});
+
+        EXPECT_FALSE(report.hasProblems());
+        ASSERT_EQ(report.findings.size(), 1U);
+        EXPECT_THAT(report.findings[0].text, HasSubstr("does not fit in 32 bits"));
     }
 }
 

@@ -76,7 +76,7 @@ TEST_F(TokensCommand, SaysThatTheServiceIsNotThere) {
 
     EXPECT_EQ(run.status, 1);
     EXPECT_EQ(run.output, "");
-    EXPECT_THAT(run.complaints, testing::StartsWith("vlmctl: the hints service does not tell"));
+    EXPECT_THAT(run.complaints, testing::StartsWith("vlmctl: the hints service gave no answer"));
 }
 
 TEST_F(TokensCommand, LetsNoCardForgeARow) {
