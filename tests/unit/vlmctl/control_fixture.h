@@ -55,7 +55,7 @@ protected:
         preferences().force(key, std::string(kSmartcardDomain), std::move(value));
     }
     std::optional<PropertyList> onMachine(const std::string& key) {
-        return preferences().value(key, kSmartcardDomain, User::Any);
+        return preferences().written(key, std::string(kSmartcardDomain), User::Any);
     }
 
     // The service answers an account's pairings like this.
