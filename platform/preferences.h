@@ -1,13 +1,17 @@
 // Preferences: values by key and domain that outlive the process, in records of their own for what
 // management forces, for every user of this machine, and for the current user on this machine.
 //
-// Shapes:    a value is a property list; keys and domains are UTF-8. A domain is a reverse-DNS
-// name. Ownership: values are the caller's own. Threads:   any. Blocking:  on the file system;
-// synchronise() also on other writers of the same record. Errors:    a record that is missing or
-// malformed reads as empty; the log tells the second.
+// Shapes:    a value is a property list; keys are UTF-8; a domain is a reverse-DNS name.
+// Ownership: values are the caller's own.
+// Threads:   any.
+// Blocking:  on the file system; synchronise() also on other writers of the same record, for a
+//            bounded time.
+// Errors:    a record that is missing, malformed or not to be trusted reads as empty; the log tells
+//            the last two. What is no domain has no record: it reads as empty, nothing can be set.
 //            Writing fails only as a false answer of synchronise().
 // Behind it: platform/linux/file_preferences.h
-// In tests:  tests/fakes/fake_preferences.h, tests/integration/preferences/
+// In tests:  tests/fakes/fake_preferences.h, tests/contracts/preferences_contract.h,
+//            tests/integration/preferences/
 
 #pragma once
 
@@ -20,6 +24,10 @@ namespace vlm::platform {
 
 // Whose record. The host is always this machine.
 enum class PreferencesUser { Any, Current };
+
+// Whether the text can be a domain: ASCII letters, digits, hyphens, underscores, and single dots
+// inside; at most 200 of them.
+bool isPreferencesDomain(std::string_view domain);
 
 class Preferences {
 public:

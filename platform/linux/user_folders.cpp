@@ -28,23 +28,6 @@ struct Place {
     std::vector<std::string> exclusive;  // ours alone
 };
 
-std::optional<std::string> environmentFolder(const char* name) {
-    // secure_getenv: whoever starts a set-user-id program chooses no folder of its user.
-    const char* value = secure_getenv(name);
-    if (value == nullptr || *value != '/') return std::nullopt;
-    return std::string(value);
-}
-
-std::optional<std::string> accountHomeFolder() {
-    std::array<char, 16384> buffer{};
-    struct passwd entry {};
-    struct passwd* found = nullptr;
-    if (getpwuid_r(geteuid(), &entry, buffer.data(), buffer.size(), &found) != 0 ||
-        found == nullptr || found->pw_dir == nullptr || *found->pw_dir != '/')
-        return std::nullopt;
-    return std::string(found->pw_dir);
-}
-
 // Opens the folder below the parent, made when it is missing. Only folders of the user's own are
 // ever opened here, so nobody else's folder gets a new one.
 FileDescriptor openOrMake(const FileDescriptor& parent, const std::string& name, int flags) {
@@ -117,6 +100,23 @@ Place configuredPlace(std::string folder) {
 }
 
 }  // namespace
+
+std::optional<std::string> environmentFolder(const char* name) {
+    // secure_getenv: whoever starts a set-user-id program chooses no folder of its user.
+    const char* value = secure_getenv(name);
+    if (value == nullptr || *value != '/') return std::nullopt;
+    return std::string(value);
+}
+
+std::optional<std::string> accountHomeFolder() {
+    std::array<char, 16384> buffer{};
+    struct passwd entry {};
+    struct passwd* found = nullptr;
+    if (getpwuid_r(geteuid(), &entry, buffer.data(), buffer.size(), &found) != 0 ||
+        found == nullptr || found->pw_dir == nullptr || *found->pw_dir != '/')
+        return std::nullopt;
+    return std::string(found->pw_dir);
+}
 
 UserPlaces UserPlaces::ofThisProcess() {
     return {environmentFolder("XDG_RUNTIME_DIR"), environmentFolder("XDG_CACHE_HOME"),

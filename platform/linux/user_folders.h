@@ -15,6 +15,13 @@
 
 namespace vlm::platform {
 
+// The folder that the variable names; none when it names no absolute path, or when the program runs
+// with raised privileges.
+std::optional<std::string> environmentFolder(const char* name);
+
+// The home folder of the effective user's account.
+std::optional<std::string> accountHomeFolder();
+
 // The places that the environment and the accounts name, none for what they leave out.
 struct UserPlaces {
     std::optional<std::string> runtimeFolder;           // XDG_RUNTIME_DIR

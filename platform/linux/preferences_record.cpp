@@ -1,0 +1,138 @@
+#include "platform/linux/preferences_record.h"
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <functional>
+#include <system_error>
+#include <utility>
+
+#include "platform/text.h"
+
+namespace vlm::platform {
+
+namespace {
+
+using State = PreferencesRecord::State;
+
+constexpr int kFlags = O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+
+PreferencesRecord withoutFile() {
+    PreferencesRecord record;
+    if (errno == ENOENT) return record;
+    record.state = State::Unreadable;
+    record.problem = text("it cannot be read: {}", std::generic_category().message(errno));
+    return record;
+}
+
+// Why the file cannot be a record at all, whatever it holds.
+std::optional<std::string> malformation(const struct stat& status) {
+    if (!S_ISREG(status.st_mode)) return "it is not a plain file";
+    if (status.st_size > static_cast<off_t>(kLargestRecord))
+        return text("it is larger than {} bytes", kLargestRecord);
+    return std::nullopt;
+}
+
+void judge(PreferencesRecord& record, const struct stat& status, const PreferencesFolder& rules) {
+    if (const auto reason = malformation(status)) {
+        record.state = State::Malformed;
+        record.problem = *reason;
+    } else if (!rules.trusts(status)) {
+        record.state = State::Untrusted;
+        record.problem = text("not only the user with the id {} can write it", rules.owner);
+    } else {
+        record.state = State::Good;
+    }
+}
+
+// The content up to one byte more than a record may have; none when reading fails.
+std::optional<Bytes> contentOf(int file, std::size_t expected) {
+    Bytes content(expected + 1);
+    std::size_t size = 0;
+    while (true) {
+        const ssize_t count = read(file, content.data() + size, content.size() - size);
+        if (count < 0 && errno == EINTR) continue;
+        if (count < 0) return std::nullopt;
+        if (count == 0) break;
+        size += static_cast<std::size_t>(count);
+        if (size > kLargestRecord) break;
+        if (size == content.size()) content.resize(kLargestRecord + 1);  // it grew
+    }
+    content.resize(size);
+    return content;
+}
+
+void parse(PreferencesRecord& record, const Bytes& content) {
+    // NOLINTNEXTLINE(cppcoreguidelines-pro-type-reinterpret-cast): the same bytes as text
+    const std::string_view bytes(reinterpret_cast<const char*>(content.data()), content.size());
+    record.contentHash = std::hash<std::string_view>()(bytes);
+    record.state = State::Malformed;
+    if (content.size() > kLargestRecord) {
+        record.problem = text("it is larger than {} bytes", kLargestRecord);
+        return;
+    }
+    const auto list = readPropertyList(content, kRecordLimits);
+    if (!list || !list->dictionary()) {
+        record.problem = list ? "it holds no dictionary" : "it is no property list";
+        return;
+    }
+    record.state = State::Good;
+    record.entries = *list->dictionary();
+}
+
+timespec clockOfFiles() {
+    timespec now{};
+    clock_gettime(CLOCK_REALTIME_COARSE, &now);
+    return now;
+}
+
+}  // namespace
+
+FileStamp FileStamp::of(const struct stat& status) {
+    return {status.st_dev, status.st_ino, status.st_size, status.st_mtim, status.st_ctim};
+}
+
+bool FileStamp::operator==(const FileStamp& other) const {
+    const auto equal = [](const timespec& one, const timespec& two) {
+        return one.tv_sec == two.tv_sec && one.tv_nsec == two.tv_nsec;
+    };
+    return device == other.device && number == other.number && size == other.size &&
+           equal(modified, other.modified) && equal(changed, other.changed);
+}
+
+bool isSettled(const timespec& changed, const timespec& now) {
+    // Some file systems keep whole seconds only, or pairs of them; the others lag by a tick of some
+    // milliseconds.
+    constexpr long kNanoseconds = 1'000'000'000;
+    const time_t seconds = now.tv_sec - changed.tv_sec;
+    if (changed.tv_nsec == 0) return seconds > 2;
+    if (seconds < 0 || seconds > 1) return seconds > 1;
+    return seconds * kNanoseconds + now.tv_nsec - changed.tv_nsec > kNanoseconds / 10;
+}
+
+PreferencesRecord readRecord(const FileDescriptor& folder, const std::string& fileName,
+                             const PreferencesFolder& rules) {
+    // The clock first, then the stamp, then the content: what changes in between shows later.
+    const timespec now = clockOfFiles();
+    struct stat status {};
+    if (fstatat(folder.get(), fileName.c_str(), &status, 0) != 0) return withoutFile();
+    FileDescriptor file;
+    // Only a plain file is opened: with a device or a pipe the opening alone has effects.
+    if (S_ISREG(status.st_mode)) {
+        file = FileDescriptor(openat(folder.get(), fileName.c_str(), kFlags));
+        if (!file || fstat(file.get(), &status) != 0) return withoutFile();
+    }
+
+    PreferencesRecord record;
+    judge(record, status, rules);
+    if (record.state == State::Good) {
+        const auto content = contentOf(file.get(), static_cast<std::size_t>(status.st_size));
+        if (!content) return withoutFile();
+        parse(record, *content);
+    }
+    if (isSettled(status.st_ctim, now)) record.stamp = FileStamp::of(status);
+    return record;
+}
+
+}  // namespace vlm::platform
