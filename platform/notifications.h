@@ -2,7 +2,8 @@
 // concern.
 //
 // Threads:   any.
-// Blocking:  until the message is handed over; never for whoever receives it.
+// Blocking:  until the message is handed over, never for what its receiver does. One that has to be
+//            started is waited for until it can take the message, but not for long.
 // Errors:    a post that reaches nobody is told in the log.
 // Behind it: platform/linux/session_bus_notifications.h
 // In tests:  tests/fakes/fake_notifications.h, tests/integration/notifications/

@@ -1,30 +1,56 @@
 #include "settings/smartcard_settings.h"
 
-#include <algorithm>
-#include <array>
-#include <string>
-#include <string_view>
-
+#include "hints/hints_client.h"
 #include "hints/hints_connection.h"
+#include "settings/smartcard_configuration.h"
+#include "settings/smartcard_settings_worker.h"
 
 using vlm::hints::log;
 using vlm::platform::String;
 
 namespace {
 
-// A machine where nobody has decided anything lets people use their cards.
-constexpr std::array<std::string_view, 2> kOnByDefault = {"allowSmartCard", "UserPairing"};
-
-std::int32_t defaultValue(const std::string& key) {
-    return std::ranges::find(kOnByDefault, key) != kOnByDefault.end() ? 1 : 0;
+// Whether certificates are mapped to accounts by what they say, so that users need no pairing.
+bool attributesAreMapped(const std::filesystem::path& configurationFile) {
+    const auto configuration = vlm::copySmartCardConfiguration(configurationFile);
+    return configuration && configuration->contains("AttributeMapping");
 }
+
+bool unmappedUsersAreAllowed() { return VLGetSmartcardSettingWorker("allowUnmappedUsers") != 0; }
 
 }  // namespace
 
-std::int32_t VLGetSmartcardSetting(const String& key) {
-    log().info("VLGetSmartcardSetting {}", key);
-    log().info("Using default value");
-    const std::int32_t value = defaultValue(key.utf8());
+namespace vlm {
+
+std::int32_t settingForUser(const String& key, const std::optional<String>& userName,
+                            const std::filesystem::path& configurationFile) {
+    log().info("VLGetSmartcardSettingForUser {}, {}", key, userName);
+    if (!userName) log().info("No username was provided {}, {}", key, userName);
+
+    std::int32_t value = VLGetSmartcardSettingWorker(key);
+    // Who may log in without a card must not be locked out by a card that was never paired.
+    if (value != 0 && key == "enforceSmartCard" && unmappedUsersAreAllowed() &&
+        !attributesAreMapped(configurationFile) && !VLIsUserBound(userName))
+        value = 0;
+
     log().info("Returning value {}", value);
     return value;
+}
+
+}  // namespace vlm
+
+std::int32_t VLGetSmartcardSetting(const String& key) {
+    log().info("VLGetSmartcardSetting {}", key);
+    const std::int32_t value = VLGetSmartcardSettingWorker(key);
+    log().info("Returning value {}", value);
+    return value;
+}
+
+std::int32_t VLGetSmartcardSettingForUser(const String& key,
+                                          const std::optional<String>& userName) {
+    return vlm::settingForUser(key, userName, vlm::kSmartcardConfiguration);
+}
+
+vlm::SmartcardSettingOrigin VLGetSmartcardSettingOrigin(const String& key) {
+    return vlm::resolveSetting(key).origin;
 }

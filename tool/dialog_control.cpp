@@ -1,8 +1,22 @@
 #include "tool/dialog_control.h"
 
+#include "platform/notifications.h"
+#include "platform/platform.h"
+#include "platform/text.h"
 #include "tool/exit_status.h"
+#include "tool/tool_identifier.h"
+#include "util/bind_utils.h"
 
 namespace vlm {
+
+namespace {
+
+void printState(bool enabled, Console& console) {
+    console.print(
+        platform::text("SmartCard Pairing dialog is {}.", enabled ? "enabled" : "disabled"));
+}
+
+}  // namespace
 
 int runAgent(Console& console) {
     console.complain("Agent mode is not available in this version.");
@@ -10,12 +24,23 @@ int runAgent(Console& console) {
 }
 
 void forceBindUi(Console& console) {
-    console.complain("Notifications are not available in this version.");
+    if (BindUtils::isBindEnabled()) {
+        platform::current().notifications().post(kForceBindUi);
+    } else {
+        console.print("Pairing UI is disabled.");
+    }
 }
 
-int runPairingUiCommand(const Options&, Console& console) {
-    console.complain("The pairing preference is not available in this version.");
-    return kExitFailure;
+int runPairingUiCommand(const Options& options, Console& console) {
+    if (options.pairingUi == "status") {
+        printState(BindUtils::isBindAllowed(), console);
+        return kExitSuccess;
+    }
+
+    const bool allowed = options.pairingUi == "enable";
+    BindUtils::setBindAllowed(allowed);
+    if (options.verbose) printState(allowed, console);
+    return kExitSuccess;
 }
 
 }  // namespace vlm

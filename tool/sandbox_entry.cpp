@@ -9,6 +9,7 @@
 
 #include "platform/platform.h"
 #include "platform/sandbox.h"
+#include "tool/tool_identifier.h"
 #include "util/bind_utils.h"
 
 namespace vlm {
@@ -16,8 +17,6 @@ namespace vlm {
 using platform::FolderAnswer;
 
 namespace {
-
-constexpr std::string_view kProfile = "org.vlm.vlmbind";
 
 // The longest path that a profile's parameter may hold, with the zero that ends it.
 constexpr std::size_t kPathBufferSize = 1024;
@@ -67,9 +66,9 @@ bool initSandbox() {
     const auto home = realPath("home", std::getenv("HOME"));
     if (!home) return false;
 
-    const auto answer = sandbox.enter(kProfile, {{"KESTRA_USER_CACHE_DIR", *cache},
-                                                 {"KESTRA_USER_TEMP_DIR", *temporary},
-                                                 {"HOME_DIR", *home}});
+    const auto answer = sandbox.enter(kToolIdentifier, {{"KESTRA_USER_CACHE_DIR", *cache},
+                                                        {"KESTRA_USER_TEMP_DIR", *temporary},
+                                                        {"HOME_DIR", *home}});
     if (answer.status == platform::kSuccess) return true;
     BindUtils::log().error("Couldn't initialize sandbox: {} ({})", answer.status, answer.errorText);
     return false;

@@ -1,12 +1,13 @@
-// BindUtils: what the command line, the agent and the pairing operation share: who is who on this
-// machine, the text form of hashes, and the program's log.
+// BindUtils: what the command line, the agent and the pairing operation share: whether the pairing
+// dialog may be offered, who is who on this machine, the text form of hashes, and the program's
+// log.
 //
 // Shapes:   names and texts are UTF-8. The text form of binary data is two upper-case hexadecimal
 //           digits per byte with nothing between them.
 // Threads:  any; there is no state but the log handle.
-// Blocking: the name and id lookups may wait for a directory server.
-// Errors:   none are reported; each operation says what it answers instead.
-// In tests: tests/unit/util/bind_utils_test.cpp
+// Blocking: the name and id lookups may wait for a directory server, the switches on the file
+// system. Errors:   none are reported; each operation says what it answers instead. In tests:
+// tests/unit/util/
 
 #pragma once
 
@@ -20,6 +21,20 @@ namespace vlm {
 
 class BindUtils {
 public:
+    // The pairing dialog is offered where it is enabled for the machine and allowed by the user.
+    // Two switches under one name, in records of their own: a user's "Do not show again" changes
+    // nothing for others, and the machine's switch overrules no user.
+
+    // The machine's switch. It is read like every smart-card setting, so management may decide it.
+    // Setting it takes the right to write the machine's record; false when that could not be done.
+    static bool setBindEnabled(bool enabled);
+    static bool isBindEnabled();
+
+    // The current user's switch. Only a boolean false disallows: whoever never decided is asked.
+    // False from setting it when it could not be written.
+    static bool setBindAllowed(bool allowed);
+    static bool isBindAllowed();
+
     // The name of the process's real user; none when that user has no account.
     static std::optional<std::string> currentUserName();
 

@@ -32,6 +32,16 @@ bool isPassedOver(int errorNumber) {
     return errorNumber == ENOENT || errorNumber == ENOTDIR || errorNumber == EACCES;
 }
 
+// Beneath a file there is never anything, so a rule on this is passed over.
+constexpr const char* kNowhere = "/dev/null/nowhere";
+
+// The folder of the user's preferences, where there is one of his own: to the home folder of
+// somebody else, the superuser's program gets no rule.
+SandboxParameter configurationFolder() {
+    auto folder = userConfigurationFolder(UserPlaces::ofThisProcess());
+    return {"CONFIG_DIR", folder.path.empty() ? kNowhere : std::move(folder.path)};
+}
+
 // Opens every place that the profile names. None, and the reason in `error`, when one is neither
 // to be opened nor to be passed over.
 std::optional<std::vector<LandlockRule>> openPlaces(const SandboxProfile& profile,
@@ -104,7 +114,9 @@ FolderAnswer LandlockSandbox::userCacheFolder() {
 SandboxAnswer LandlockSandbox::enter(std::string_view profileName,
                                      const std::vector<SandboxParameter>& parameters) {
     // All that can be wrong with the profile shows before anything is confined.
-    const auto read = readInstalledProfile(profileName, parameters);
+    auto all = parameters;
+    all.push_back(configurationFolder());
+    const auto read = readInstalledProfile(profileName, std::move(all));
     if (!read.profile) return {kFailed, read.errorText};
     std::string error;
     auto rules = openPlaces(*read.profile, error);

@@ -15,7 +15,9 @@ public:
     FolderAnswer userTemporaryFolder() override;
     FolderAnswer userCacheFolder() override;
 
-    // Besides the caller's parameters a profile has $(INSTALL_DIR), the folder above the program's.
+    // Besides the caller's parameters a profile has $(INSTALL_DIR), the folder above the program's,
+    // and $(CONFIG_DIR), the folder of the user's preferences. That one is made when it is missing,
+    // since a confined process can make it no more.
     SandboxAnswer enter(std::string_view profileName,
                         const std::vector<SandboxParameter>& parameters) override;
 

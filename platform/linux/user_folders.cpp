@@ -24,15 +24,16 @@ constexpr mode_t kOthers = S_IRWXG | S_IRWXO;
 // Where a private folder may be: the folders below the base are made when they are missing.
 struct Place {
     std::string base;
-    std::vector<const char*> shared;     // belong to the user, other programs use them too
-    std::vector<const char*> exclusive;  // ours alone
+    std::vector<std::string> shared;     // belong to the user, other programs use them too
+    std::vector<std::string> exclusive;  // ours alone
 };
 
 // Opens the folder below the parent, made when it is missing. Only folders of the user's own are
 // ever opened here, so nobody else's folder gets a new one.
-FileDescriptor openOrMake(const FileDescriptor& parent, const char* name, int flags) {
-    if (mkdirat(parent.get(), name, kPrivate) != 0 && errno != EEXIST) return {};
-    return FileDescriptor(openat(parent.get(), name, O_RDONLY | O_DIRECTORY | O_CLOEXEC | flags));
+FileDescriptor openOrMake(const FileDescriptor& parent, const std::string& name, int flags) {
+    if (mkdirat(parent.get(), name.c_str(), kPrivate) != 0 && errno != EEXIST) return {};
+    return FileDescriptor(
+        openat(parent.get(), name.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC | flags));
 }
 
 bool isOwned(const struct stat& folder, mode_t forbidden) {
@@ -59,12 +60,12 @@ FolderAnswer openPlace(const Place& place) {
     FileDescriptor folder(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!folder || !isSharedSafely(folder)) return {{}, errno};
     // People move a shared folder to another disk and leave a link; ours has no reason to be one.
-    for (const char* name : place.shared) {
+    for (const auto& name : place.shared) {
         path.append("/").append(name);
         folder = openOrMake(folder, name, 0);
         if (!folder || !isSharedSafely(folder)) return {{}, errno};
     }
-    for (const char* name : place.exclusive) {
+    for (const auto& name : place.exclusive) {
         path.append("/").append(name);
         folder = openOrMake(folder, name, O_NOFOLLOW);
         if (!folder || !isPrivate(folder)) return {{}, errno};
@@ -81,12 +82,21 @@ FolderAnswer firstUsable(const std::vector<Place>& places) {
     return answer;
 }
 
-std::vector<Place> cachePlaces(const UserPlaces& from, const std::vector<const char*>& exclusive) {
+std::vector<Place> cachePlaces(const UserPlaces& from, const std::vector<std::string>& exclusive) {
     std::vector<Place> places;
     if (from.cacheHome) places.push_back({*from.cacheHome, {}, exclusive});
     if (from.home) places.push_back({*from.home, {".cache"}, exclusive});
     if (from.accountHome) places.push_back({*from.accountHome, {".cache"}, exclusive});
     return places;
+}
+
+// The variable may name a folder that is not there yet: that one is made too, in a folder of the
+// user's.
+Place configuredPlace(std::string folder) {
+    while (folder.size() > 1 && folder.back() == '/') folder.pop_back();
+    const auto slash = folder.rfind('/');
+    if (slash == 0 || access(folder.c_str(), F_OK) == 0) return {folder, {kOwnFolder}, {}};
+    return {folder.substr(0, slash), {folder.substr(slash + 1), kOwnFolder}, {}};
 }
 
 }  // namespace
@@ -110,7 +120,7 @@ std::optional<std::string> accountHomeFolder() {
 
 UserPlaces UserPlaces::ofThisProcess() {
     return {environmentFolder("XDG_RUNTIME_DIR"), environmentFolder("XDG_CACHE_HOME"),
-            environmentFolder("HOME"), accountHomeFolder()};
+            environmentFolder("HOME"), accountHomeFolder(), environmentFolder("XDG_CONFIG_HOME")};
 }
 
 FolderAnswer userTemporaryFolder(const UserPlaces& from) {
@@ -121,6 +131,13 @@ FolderAnswer userTemporaryFolder(const UserPlaces& from) {
 
 FolderAnswer userCacheFolder(const UserPlaces& from) {
     return firstUsable(cachePlaces(from, {kOwnFolder}));
+}
+
+FolderAnswer userConfigurationFolder(const UserPlaces& from) {
+    if (from.configurationHome) return openPlace(configuredPlace(*from.configurationHome));
+    const auto& home = from.home ? from.home : from.accountHome;
+    if (!home) return {{}, ENOENT};
+    return openPlace({*home, {".config", kOwnFolder}, {}});
 }
 
 }  // namespace vlm::platform

@@ -24,15 +24,20 @@ std::optional<std::string> accountHomeFolder();
 
 // The places that the environment and the accounts name, none for what they leave out.
 struct UserPlaces {
-    std::optional<std::string> runtimeFolder;  // XDG_RUNTIME_DIR
-    std::optional<std::string> cacheHome;      // XDG_CACHE_HOME
-    std::optional<std::string> home;           // HOME
-    std::optional<std::string> accountHome;    // of the effective user's account
+    std::optional<std::string> runtimeFolder;           // XDG_RUNTIME_DIR
+    std::optional<std::string> cacheHome;               // XDG_CACHE_HOME
+    std::optional<std::string> home;                    // HOME
+    std::optional<std::string> accountHome;             // of the effective user's account
+    std::optional<std::string> configurationHome = {};  // XDG_CONFIG_HOME
 
     static UserPlaces ofThisProcess();
 };
 
 FolderAnswer userTemporaryFolder(const UserPlaces& places);
 FolderAnswer userCacheFolder(const UserPlaces& places);
+
+// The folder of the user's preferences. There is one place for it only, since what is written in
+// one must not be looked for in another. It may be a link, and others may read it.
+FolderAnswer userConfigurationFolder(const UserPlaces& places);
 
 }  // namespace vlm::platform

@@ -12,7 +12,8 @@
 # is replaced while the program runs is not the file that the rule was made for.
 #
 # $(HOME_DIR), $(KESTRA_USER_CACHE_DIR) and $(KESTRA_USER_TEMP_DIR) are the folders of the user who
-# runs the program, $(INSTALL_DIR) is the folder above the program's own.
+# runs the program, $(CONFIG_DIR) is the one of his preferences, $(INSTALL_DIR) is the folder above
+# the program's own.
 
 # The C library, the modules that look up accounts, locales, time zones, character sets.
 read /usr
@@ -55,7 +56,7 @@ read /dev/urandom
 write /dev/null
 
 # The user's own preferences, and room for passing data.
-write $(HOME_DIR)/.config/vlm
+write $(CONFIG_DIR)
 write $(KESTRA_USER_CACHE_DIR)
 write $(KESTRA_USER_TEMP_DIR)
 

@@ -28,6 +28,16 @@ constexpr std::array kSteps = {
        CREATE INDEX pairing_by_hash ON pairing (hash);)",
 };
 
+constexpr const char* kOthers =
+    "it is the database of another program. Move it away or give another path";
+
+std::string newerThanThis(int version) {
+    return platform::text(
+        "its version is {}, and this program knows versions up to {}. "
+        "Install the newer program again",
+        version, kSteps.size());
+}
+
 int number(SQLite::Database& database, const char* query) {
     return database.execAndGet(query).getInt();
 }
@@ -40,13 +50,9 @@ std::optional<std::string> migratePairings(SQLite::Database& database) {
     const auto version = number(database, "PRAGMA user_version");
     const bool isEmpty = number(database, "SELECT count(*) FROM sqlite_master") == 0;
     const bool isNew = isEmpty && application == 0 && version == 0;
-    if (!isNew && application != kApplication)
-        return "it is the database of another program. Move it away or give another path";
+    if (!isNew && application != kApplication) return kOthers;
     if (version < 0 || static_cast<std::size_t>(version) > kSteps.size())
-        return platform::text(
-            "its version is {}, and this program knows versions up to {}. "
-            "Install the newer program again",
-            version, kSteps.size());
+        return newerThanThis(version);
     if (static_cast<std::size_t>(version) == kSteps.size()) return std::nullopt;
 
     for (auto step = static_cast<std::size_t>(version); step < kSteps.size(); ++step)
@@ -54,6 +60,18 @@ std::optional<std::string> migratePairings(SQLite::Database& database) {
     database.exec(platform::text("PRAGMA application_id = {}", kApplication));
     database.exec(platform::text("PRAGMA user_version = {}", kSteps.size()));
     transaction.commit();
+    return std::nullopt;
+}
+
+std::optional<std::string> whyNotReadable(SQLite::Database& database) {
+    if (number(database, "PRAGMA application_id") != kApplication) return kOthers;
+    const auto version = number(database, "PRAGMA user_version");
+    if (version < 0 || static_cast<std::size_t>(version) > kSteps.size())
+        return newerThanThis(version);
+    if (static_cast<std::size_t>(version) < kSteps.size())
+        return platform::text(
+            "its version is {}, which the hints service brings to {} when it next starts", version,
+            kSteps.size());
     return std::nullopt;
 }
 

@@ -12,4 +12,8 @@ namespace vlm::service {
 // is changed then.
 std::optional<std::string> migratePairings(SQLite::Database& database);
 
+// Why the pairings in the database cannot be read as they are; nothing is changed. May throw
+// SQLite::Exception.
+std::optional<std::string> whyNotReadable(SQLite::Database& database);
+
 }  // namespace vlm::service

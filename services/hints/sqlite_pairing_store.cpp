@@ -3,6 +3,7 @@
 #include <SQLiteCpp/Database.h>
 #include <SQLiteCpp/Statement.h>
 
+#include <filesystem>
 #include <utility>
 
 #include "platform/text.h"
@@ -86,6 +87,9 @@ struct SqlitePairingStore::Database {
           withHash(connection,
                    "SELECT account, hash, sequence, paired_at FROM pairing "
                    "WHERE hash = ? ORDER BY sequence DESC"),
+          all(connection,
+              "SELECT account, hash, sequence, paired_at FROM pairing "
+              "ORDER BY account, sequence DESC"),
           anyOf(connection, "SELECT 1 FROM pairing WHERE account = ? LIMIT 1") {}
 
     SQLite::Database connection;
@@ -93,6 +97,7 @@ struct SqlitePairingStore::Database {
     SQLite::Statement unpair;
     SQLite::Statement ofAccount;
     SQLite::Statement withHash;
+    SQLite::Statement all;
     SQLite::Statement anyOf;
 };
 
@@ -116,6 +121,25 @@ Outcome<std::unique_ptr<SqlitePairingStore>> SqlitePairingStore::open(const std:
         return cannotOpen(path, platform::text("{}. If it is damaged, move it away and restore a "
                                                "copy of it",
                                                error.what()));
+    }
+}
+
+Outcome<std::unique_ptr<SqlitePairingStore>> SqlitePairingStore::openToRead(
+    const std::string& path) {
+    // A pipe in the file's place must not make this wait.
+    std::error_code error;
+    const auto file = std::filesystem::status(path, error);
+    if (file.type() == std::filesystem::file_type::not_found)
+        return cannotOpen(path, "there is none; the hints service makes it when it first starts");
+    if (error) return cannotOpen(path, error.message());
+    if (!std::filesystem::is_regular_file(file)) return cannotOpen(path, "it is no regular file");
+    try {
+        SQLite::Database database(path, SQLite::OPEN_READONLY, kPatienceMilliseconds);
+        if (const auto reason = whyNotReadable(database)) return cannotOpen(path, *reason);
+        return std::unique_ptr<SqlitePairingStore>(
+            new SqlitePairingStore(std::make_unique<Database>(std::move(database))));
+    } catch (const std::exception& failure) {
+        return cannotOpen(path, failure.what());
     }
 }
 
@@ -152,6 +176,13 @@ Outcome<std::vector<Pairing>> SqlitePairingStore::pairingsWith(const platform::B
     return guarded([&] {
         Use use(_database->withHash);
         use.bindHash(1, hash);
+        return readAll(use);
+    });
+}
+
+Outcome<std::vector<Pairing>> SqlitePairingStore::allPairings() {
+    return guarded([&] {
+        Use use(_database->all);
         return readAll(use);
     });
 }

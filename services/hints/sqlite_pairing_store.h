@@ -21,6 +21,11 @@ public:
     // damaged, and a schema that is newer than this program. The file is left as it was then.
     static Outcome<std::unique_ptr<SqlitePairingStore>> open(const std::string& path);
 
+    // Opens a database that is there, to read it only: for a program beside the service. It is
+    // never made, never migrated, and pair() and unpair() are refused. The library that reads it
+    // may leave its own empty files beside it, which the service clears away.
+    static Outcome<std::unique_ptr<SqlitePairingStore>> openToRead(const std::string& path);
+
     ~SqlitePairingStore() override;
 
     std::optional<Refusal> pair(const std::string& account, const platform::Bytes& hash,
@@ -29,6 +34,9 @@ public:
     Outcome<std::vector<Pairing>> pairingsOf(const std::string& account) override;
     Outcome<std::vector<Pairing>> pairingsWith(const platform::Bytes& hash) override;
     Outcome<bool> isPaired(const std::string& account) override;
+
+    // Everybody's, account by account, the latest of each first.
+    Outcome<std::vector<Pairing>> allPairings();
 
 private:
     struct Database;

@@ -76,6 +76,9 @@ while IFS= read -r file; do
     while IFS= read -r include; do
         case $file in
             platform/linux/*) check_lower "$file" "$include" platform ;;
+            # The administrator's tool is a client that stands on the floors, not below them.
+            services/vlmctl/*)
+                check_lower "$file" "$include" platform hints settings bind services ;;
             services/*) check_lower "$file" "$include" platform services ;;
             *) check_upper "$file" "$(floor_number "${file%%/*}")" "$include" ;;
         esac

@@ -6,7 +6,7 @@ set -euo pipefail
 check=$(cd "$(dirname "$0")" && pwd)/check_includes.sh
 tree=$(mktemp -d)
 trap 'rm -rf "$tree"' EXIT
-mkdir -p "$tree"/{platform/linux,hints,settings,util,bind,ui,tool,services/hints}
+mkdir -p "$tree"/{platform/linux,hints,settings,util,bind,ui,tool,services/hints,services/vlmctl}
 
 plant() {  # FILE INCLUDE
     printf '#include <vector>\n#include "platform/types.h"\n' >"$tree/tool/good.cpp"
@@ -29,6 +29,9 @@ expect pass tool/a.cpp '"bind/bind_operation.h"'
 expect pass tool/options.cpp '<unistd.h>'
 expect pass platform/linux/a.cpp '<systemd/sd-bus.h>'
 expect pass services/hints/a.cpp '"platform/linux/sd_bus_message.h"'
+expect pass services/vlmctl/a.cpp '"bind/token_info.h"'
+expect pass services/vlmctl/a.cpp '"settings/known_settings.h"'
+expect fail services/vlmctl/a.cpp '"tool/console.h"'
 expect fail tool/a.cpp '<unistd.h>'
 expect fail tool/a.cpp '<systemd/sd-bus.h>'
 expect fail tool/a.cpp '"platform/linux/sd_bus_message.h"'

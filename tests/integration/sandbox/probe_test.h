@@ -33,7 +33,7 @@ struct Report {
 class ProbeTest : public ::testing::Test {
 protected:
     ProbeTest() {
-        std::filesystem::create_directories(home() / ".config/vlm");
+        std::filesystem::create_directories(home());
         std::filesystem::create_directories(elsewhere());
         std::filesystem::create_directories(runtime());
     }
@@ -61,7 +61,8 @@ protected:
         options.environment = {
             {"HOME", home().string()},
             {"XDG_RUNTIME_DIR", runtime().string()},
-            {"XDG_CACHE_HOME", std::nullopt},
+            {"XDG_CACHE_HOME", cacheHome},
+            {"XDG_CONFIG_HOME", configurationHome},
             // At its end the leak checker looks into the process with ptrace, which is denied.
             {"ASAN_OPTIONS", "detect_leaks=0"},
         };
@@ -93,6 +94,8 @@ protected:
     }
 
     std::string homeName = "home";
+    std::optional<std::string> cacheHome;          // XDG_CACHE_HOME
+    std::optional<std::string> configurationHome;  // XDG_CONFIG_HOME
     std::string program = SANDBOX_PROBE;
     std::vector<std::string> probeOptions;
 

@@ -1,0 +1,26 @@
+#include "services/vlmctl/shown.h"
+
+#include <array>
+#include <ctime>
+#include <limits>
+
+#include "services/hints/shown_text.h"
+
+namespace vlm::control {
+
+std::string shown(std::string_view text) {
+    return service::shownText(text, std::numeric_limits<std::size_t>::max());
+}
+
+std::string hexadecimal(const platform::Bytes& bytes) { return service::shownHash(bytes); }
+
+std::string pointInTime(std::int64_t seconds) {
+    const std::time_t time = seconds;
+    std::tm parts = {};
+    std::array<char, 64> text = {};
+    if (!gmtime_r(&time, &parts)) return std::to_string(seconds);
+    const auto size = std::strftime(text.data(), text.size(), "%Y-%m-%dT%H:%M:%SZ", &parts);
+    return {text.data(), size};
+}
+
+}  // namespace vlm::control

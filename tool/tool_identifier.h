@@ -1,0 +1,13 @@
+#pragma once
+
+#include <string_view>
+
+namespace vlm {
+
+// The tool's name on this platform: of its sandbox profile, and the root of its other names.
+inline constexpr std::string_view kToolIdentifier = "org.vlm.vlmbind";
+
+// The notification on which the platform starts the agent, and the agent shows its dialog.
+inline constexpr std::string_view kForceBindUi = "org.vlm.vlmbind.force-bind-ui";
+
+}  // namespace vlm
