@@ -64,7 +64,7 @@ std::string timeOf(const Pairing& pairing) {
 void printTable(const Pairings& pairings, const Arguments& arguments, Output& output) {
     Table table({"ACCOUNT", "PUBLIC KEY HASH", "PAIRED AT"});
     for (const auto& pairing : pairings)
-        table.add({pairing.account, hexadecimal(pairing.hash), timeOf(pairing)});
+        table.add({pairing.account, platform::hexadecimal(pairing.hash), timeOf(pairing)});
     table.print(output, arguments.legend, "No pairings.");
 }
 
@@ -73,7 +73,7 @@ Json jsonOf(const Pairings& pairings) {
     for (const auto& pairing : pairings) {
         const auto time = timeOf(pairing);
         list.emplace_back(Json::Object{{"account", pairing.account},
-                                       {"hash", hexadecimal(pairing.hash)},
+                                       {"hash", platform::hexadecimal(pairing.hash)},
                                        {"pairedAt", time.empty() ? Json() : Json(time)}});
     }
     return Json::Object{{"pairings", std::move(list)}};

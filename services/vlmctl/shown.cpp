@@ -2,17 +2,14 @@
 
 #include <array>
 #include <ctime>
-#include <limits>
 
-#include "services/hints/shown_text.h"
+#include "platform/harmless_text.h"
 
 namespace vlm::control {
 
 std::string shown(std::string_view text) {
-    return service::shownText(text, std::numeric_limits<std::size_t>::max());
+    return platform::harmlessText(text, platform::kAllCharacters);
 }
-
-std::string hexadecimal(const platform::Bytes& bytes) { return service::shownHash(bytes); }
 
 std::string pointInTime(std::int64_t seconds) {
     const std::time_t time = seconds;

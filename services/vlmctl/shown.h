@@ -1,4 +1,4 @@
-// How a table and a message show what others wrote: texts of cards, file names, binary data.
+// How a table and a message show what others wrote: texts of cards, file names, times.
 
 #pragma once
 
@@ -6,15 +6,10 @@
 #include <string>
 #include <string_view>
 
-#include "platform/types.h"
-
 namespace vlm::control {
 
 // The text with everything that would act on a terminal instead of showing as U+FFFD.
 std::string shown(std::string_view text);
-
-// Upper-case hexadecimal, as vlmbind prints public-key hashes.
-std::string hexadecimal(const platform::Bytes& bytes);
 
 // Seconds since 1970-01-01 00:00:00 UTC as "2024-05-01T12:00:00Z", or as the number where the
 // calendar ends.

@@ -55,7 +55,8 @@ std::string accountsUsing(const TokenInfo& info, const Bytes& hash) {
 }
 
 Identity identityOf(const TokenInfo& info, const Bytes& hash) {
-    Identity identity{.name = textAt(info.names, hash), .accounts = {}, .hash = hexadecimal(hash)};
+    Identity identity{
+        .name = textAt(info.names, hash), .accounts = {}, .hash = platform::hexadecimal(hash)};
     const auto users = accountsUsing(info, hash);
     const auto paired = textAt(info.bound, hash);
     if (!users.empty()) {

@@ -15,8 +15,6 @@
 namespace vlm::test {
 namespace {
 
-using tests::identity;
-
 using ::testing::HasSubstr;
 using ::testing::MatchesRegex;
 
