@@ -54,8 +54,11 @@ private:
         return static_cast<std::uint64_t>(product) ^ static_cast<std::uint64_t>(product >> 64U);
     }
 
+    // The size is no part of what the bytes are mixed with: a byte could make up for it, and so
+    // pieces that end in zeros could be made to meet without knowing the secret.
     std::uint64_t hashOf(std::span<const std::uint8_t> bytes) const {
-        std::uint64_t hash = _secret[0] ^ bytes.size();
+        const std::uint64_t last = _secret[2] + 2 * bytes.size();
+        std::uint64_t hash = _secret[0];
         std::uint64_t piece = 0;
         for (; bytes.size() > sizeof piece; bytes = bytes.subspan(sizeof piece)) {
             std::memcpy(&piece, bytes.data(), sizeof piece);
@@ -63,7 +66,7 @@ private:
         }
         piece = 0;
         if (!bytes.empty()) std::memcpy(&piece, bytes.data(), bytes.size());
-        return folded(hash ^ piece, _secret[2]);
+        return folded(hash ^ piece, last);
     }
 
     void grow();
