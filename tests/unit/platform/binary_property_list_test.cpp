@@ -140,12 +140,13 @@ TEST(BinaryPropertyListTest, CountsEntriesOfALongDictionary) {
     Dictionary dictionary;
     for (char letter = 'a'; letter < 'a' + 15; ++letter)
         dictionary.append(std::string(1, letter), true);
+    constexpr std::string_view entries =
+        "DF 10 0F 01 02 03 04 05 06 07 08 09 0A 0B 0C 0D 0E 0F"
+        "10 10 10 10 10 10 10 10 10 10 10 10 10 10 10";
     expectBothWays({"fifteen entries, one value",
                     dictionary,
                     {"51 61", "51 62", "51 63", "51 64", "51 65", "51 66", "51 67", "51 68",
-                     "51 69", "51 6A", "51 6B", "51 6C", "51 6D", "51 6E", "51 6F", "09",
-                     "DF 10 0F 01 02 03 04 05 06 07 08 09 0A 0B 0C 0D 0E 0F"
-                     "10 10 10 10 10 10 10 10 10 10 10 10 10 10 10"},
+                     "51 69", "51 6A", "51 6B", "51 6C", "51 6D", "51 6E", "51 6F", "09", entries},
                     {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 0}});
 }
 

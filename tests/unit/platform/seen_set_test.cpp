@@ -72,9 +72,9 @@ TEST_F(SeenSetTest, TellsPiecesThatDifferInOneByteApart) {
 }
 
 TEST_F(SeenSetTest, KeepsEveryPieceWhileItGrows) {
-    std::vector<std::string> pieces;
-    for (int number = 0; number < 10000; ++number)
-        pieces.push_back("piece " + std::to_string(number));
+    std::vector<std::string> pieces(10000);
+    for (std::size_t number = 0; number < pieces.size(); ++number)
+        pieces[number] = "piece " + std::to_string(number);
     expectAllToldApart(pieces);
 }
 
