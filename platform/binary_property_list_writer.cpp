@@ -1,194 +1,16 @@
-#include <algorithm>
 #include <array>
-#include <bit>
 #include <cstring>
+#include <vector>
 
-#include "platform/binary_property_list.h"
+#include "platform/binary_property_list_output.h"
+#include "platform/binary_property_list_room.h"
 #include "platform/seen_set.h"
-#include "platform/utf.h"
 
 namespace vlm::platform {
 
 namespace {
 
 using namespace binary_format;
-
-// The narrowest of the widths that integers, offsets and references come in.
-std::size_t widthOf(std::uint64_t number) {
-    if (number <= 0xFF) return 1;
-    if (number <= 0xFFFF) return 2;
-    return number <= 0xFFFFFFFF ? 4 : 8;
-}
-
-// Writes into memory that is known to be large enough.
-class Cursor {
-public:
-    explicit Cursor(std::uint8_t* place) : _place(place) {}
-
-    std::uint8_t* place() const { return _place; }
-    void goBackTo(std::uint8_t* place) { _place = place; }
-
-    // Big-endian.
-    void putNumber(std::uint64_t number, std::size_t width) {
-        for (std::size_t byte = width; byte-- > 0; number >>= 8U)
-            _place[byte] = static_cast<std::uint8_t>(number);
-        _place += width;
-    }
-
-    void putMarker(Kind kind, std::uint64_t lowerHalf) {
-        *_place++ = static_cast<std::uint8_t>(static_cast<std::uint64_t>(kind) << 4U | lowerHalf);
-    }
-
-    void putInteger(std::uint64_t number) {
-        const std::size_t width = widthOf(number);
-        putMarker(Kind::Integer, static_cast<std::uint64_t>(std::countr_zero(width)));
-        putNumber(number, width);
-    }
-
-    void putCount(Kind kind, std::size_t count) {
-        if (count < kLongCount) return putMarker(kind, count);
-        putMarker(kind, kLongCount);
-        putInteger(count);
-    }
-
-    void putBytes(const void* bytes, std::size_t size) {
-        if (size > 0) std::memcpy(_place, bytes, size);
-        _place += size;
-    }
-
-private:
-    std::uint8_t* _place;
-};
-
-// What a marker with a count takes.
-std::size_t countBytes(std::size_t count) {
-    return count < kLongCount ? 1 : 1 + 1 + widthOf(count);
-}
-
-bool isAscii(std::string_view text) {
-    std::uint64_t bits = 0;
-    for (; text.size() >= sizeof bits; text.remove_prefix(sizeof bits)) {
-        std::memcpy(&bits, text.data(), sizeof bits);
-        if ((bits & 0x8080808080808080U) != 0) return false;
-    }
-    return std::ranges::all_of(text,
-                               [](char byte) { return static_cast<unsigned char>(byte) < 0x80; });
-}
-
-// Puts what is neither text nor a collection.
-struct ScalarPutter {
-    Cursor& output;
-
-    void operator()(bool value) const { output.putMarker(Kind::Constant, value ? kTrue : kFalse); }
-    void operator()(std::int64_t value) const {
-        output.putInteger(static_cast<std::uint64_t>(value));
-    }
-    // The 16-byte form, since eight bytes are read as signed.
-    void operator()(std::uint64_t value) const {
-        output.putMarker(Kind::Integer, 4);
-        output.putNumber(0, 8);
-        output.putNumber(value, 8);
-    }
-    void operator()(double value) const { putDouble(Kind::Real, value); }
-    void operator()(PropertyList::Date date) const { putDouble(Kind::Date, date.secondsSince2001); }
-    void operator()(const Bytes& bytes) const {
-        output.putCount(Kind::Data, bytes.size());
-        output.putBytes(bytes.data(), bytes.size());
-    }
-
-private:
-    void putDouble(Kind kind, double value) const {
-        output.putMarker(kind, kDateWidth);
-        output.putNumber(std::bit_cast<std::uint64_t>(value), 8);
-    }
-};
-
-// ASCII where the text is ASCII; false when it is not UTF-8.
-bool putText(Cursor& output, const std::string& text) {
-    if (isAscii(text)) {
-        output.putCount(Kind::Ascii, text.size());
-        output.putBytes(text.data(), text.size());
-        return true;
-    }
-    const auto units = utf8ToUtf16(text);
-    if (!units) return false;
-    output.putCount(Kind::Utf16, units->size());
-    for (const char16_t unit : *units) output.putNumber(unit, 2);
-    return true;
-}
-
-// The room that a value needs at the most, counted before anything is written: so nothing that is
-// too large is begun, and nothing moves while it is written.
-class Room {
-public:
-    explicit Room(const PropertyListLimits& limits) : _limits(limits), _budget(limits) {}
-
-    // False when the value is not within the limits.
-    bool addTop(const PropertyList& value) { return _budget.takeObjects(1) && add(value, 0); }
-
-    std::size_t scalars = 0;
-    std::size_t sharable = 0;  // of them, texts and bytes
-    std::size_t collections = 0;
-    std::size_t references = 0;
-
-    std::size_t objects() const { return scalars + collections; }
-    std::size_t bytes() const {
-        const std::size_t table = kMagic.size() + _bytes + references * widthOf(objects());
-        return table + objects() * widthOf(table) + kTrailerSize;
-    }
-
-private:
-    bool add(const PropertyList& value, std::size_t depth) {
-        return value.visit([&](const auto& held) { return add(held, depth); });
-    }
-    bool add(bool, std::size_t) { return addScalar(1); }
-    bool add(std::int64_t value, std::size_t) {
-        return addScalar(1 + widthOf(static_cast<std::uint64_t>(value)));
-    }
-    bool add(std::uint64_t, std::size_t) { return addScalar(1 + 2 * 8); }
-    bool add(double, std::size_t) { return addScalar(1 + 8); }
-    bool add(PropertyList::Date, std::size_t) { return addScalar(1 + 8); }
-    bool add(const std::string& text, std::size_t) {
-        if (!_budget.takeBytes(text.size())) return false;
-        ++sharable;
-        if (isAscii(text)) return addScalar(countBytes(text.size()) + text.size());
-        // A character of one byte takes two, of two or three bytes two, of four bytes four.
-        return addScalar(countBytes(text.size()) + 2 * text.size());
-    }
-    bool add(const Bytes& bytes, std::size_t) {
-        ++sharable;
-        return _budget.takeBytes(bytes.size()) &&
-               addScalar(countBytes(bytes.size()) + bytes.size());
-    }
-    bool add(const PropertyList::Array& array, std::size_t depth) {
-        return addCollection(array.size(), depth) &&
-               std::ranges::all_of(array,
-                                   [&](const PropertyList& each) { return add(each, depth + 1); });
-    }
-    bool add(const PropertyList::Dictionary& dictionary, std::size_t depth) {
-        return addCollection(2 * dictionary.size(), depth) &&
-               std::ranges::all_of(dictionary, [&](const auto& entry) {
-                   return add(entry.first, depth) && add(entry.second, depth + 1);
-               });
-    }
-
-    bool addScalar(std::size_t bytes) {
-        _bytes += bytes;
-        ++scalars;
-        return true;
-    }
-    bool addCollection(std::size_t size, std::size_t depth) {
-        if (depth == _limits.depth || !_budget.takeObjects(size)) return false;
-        _bytes += countBytes(size);
-        ++collections;
-        references += size;
-        return true;
-    }
-
-    const PropertyListLimits& _limits;
-    Budget _budget;
-    std::size_t _bytes = 0;  // of scalars and of counts
-};
 
 // Numbers the values on first sight, a collection before its contents, so that the top object is
 // number 0. Scalars are written at once; collections behind them, since how wide a reference is
@@ -352,9 +174,9 @@ private:
 
 std::optional<Bytes> writeBinaryPropertyList(const PropertyList& value,
                                              const PropertyListLimits& limits) {
-    Room room(limits);
-    if (!room.addTop(value)) return std::nullopt;
-    return Writer(room).write(value, limits.bytes);
+    const auto room = roomFor(value, limits);
+    if (!room) return std::nullopt;
+    return Writer(*room).write(value, limits.bytes);
 }
 
 }  // namespace vlm::platform

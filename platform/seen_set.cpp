@@ -17,7 +17,7 @@ const SeenSet::Secret& SeenSet::secretOfThisProcess() {
 
 SeenSet::SeenSet(std::size_t expected)
     : _secret(secretOfThisProcess()),
-      _slots(std::bit_ceil(2 * expected + 2)),
+      _slots(std::bit_ceil(expected + expected / 2 + 2)),
       _mask(_slots.size() - 1) {}
 
 void SeenSet::grow() {

@@ -9,6 +9,7 @@
 #pragma once
 
 #include <array>
+#include <cstddef>
 #include <cstdint>
 #include <cstring>
 #include <span>
@@ -27,7 +28,7 @@ public:
     template <typename IsSame>
     std::uint32_t findOrAdd(std::span<const std::uint8_t> bytes, std::uint32_t number,
                             IsSame isSame) {
-        if (2 * _used >= _slots.size()) grow();
+        if (3 * _used >= 2 * _slots.size()) grow();
         const auto hash = static_cast<std::uint32_t>(hashOf(bytes));
         for (std::size_t at = hash & _mask;; at = (at + 1) & _mask) {
             Slot& slot = _slots[at];
@@ -54,16 +55,39 @@ private:
         return static_cast<std::uint64_t>(product) ^ static_cast<std::uint64_t>(product >> 64U);
     }
 
+    template <typename Word>
+    static std::uint64_t wordAt(const std::uint8_t* place) {
+        Word word = 0;
+        std::memcpy(&word, place, sizeof word);
+        return word;
+    }
+
+    // All bytes of a piece of less than eight; those in the middle may be in it twice.
+    static std::uint64_t shortPiece(const std::uint8_t* begin, std::size_t size) {
+        if (size == 0) return 0;
+        if (size >= 4)
+            return wordAt<std::uint32_t>(begin) << 32U | wordAt<std::uint32_t>(begin + size - 4);
+        return std::uint64_t{begin[0]} << 16U | std::uint64_t{begin[size / 2]} << 8U |
+               begin[size - 1];
+    }
+
+    // The size is no part of what the bytes are mixed with: a byte could make up for it, and so
+    // pieces that end in zeros could be made to meet without knowing the secret. The last words
+    // may overlap what came before; pieces of one size are told apart all the same.
     std::uint64_t hashOf(std::span<const std::uint8_t> bytes) const {
-        std::uint64_t hash = _secret[0] ^ bytes.size();
-        std::uint64_t piece = 0;
-        for (; bytes.size() > sizeof piece; bytes = bytes.subspan(sizeof piece)) {
-            std::memcpy(&piece, bytes.data(), sizeof piece);
-            hash = folded(hash ^ piece, _secret[1]);
-        }
-        piece = 0;
-        if (!bytes.empty()) std::memcpy(&piece, bytes.data(), bytes.size());
-        return folded(hash ^ piece, _secret[2]);
+        using Word = std::uint64_t;
+        constexpr std::size_t kTwoWords = 2 * sizeof(Word);
+        const std::uint8_t* begin = bytes.data();
+        const std::uint8_t* const end = begin + bytes.size();
+        const std::uint64_t last = _secret[2] + 2 * bytes.size();
+        std::uint64_t hash = _secret[0];
+        if (bytes.size() < sizeof(Word))
+            return folded(hash ^ shortPiece(begin, bytes.size()), last);
+        for (; end - begin > std::ptrdiff_t{kTwoWords}; begin += kTwoWords)
+            hash =
+                folded(hash ^ wordAt<Word>(begin), _secret[1] ^ wordAt<Word>(begin + sizeof(Word)));
+        const std::uint8_t* const first = bytes.size() < kTwoWords ? begin : end - kTwoWords;
+        return folded(hash ^ wordAt<Word>(first), last ^ wordAt<Word>(end - sizeof(Word)));
     }
 
     void grow();

@@ -35,22 +35,24 @@ inline void appendNumber(Bytes& bytes, std::uint64_t number, std::size_t width) 
         bytes.push_back(byte < 8 ? static_cast<std::uint8_t>(number >> (byte * 8)) : 0);
 }
 
-// A list of the objects given in hexadecimal. What is not set is made to fit them.
+// A list of the objects given in hexadecimal, in the order in which they lie. What is not set is
+// made to fit them.
 struct BinaryList {
     std::vector<std::string_view> objects;
     std::uint64_t topObject = 0;
     std::uint8_t offsetWidth = 1;
     std::uint8_t referenceWidth = 1;
-    std::optional<std::vector<std::uint64_t>> offsets = {};
+    std::optional<std::vector<std::uint64_t>> offsets = {};  // by number
+    std::vector<std::size_t> numbers = {};  // of the objects; none: they are numbered as they lie
     std::optional<std::uint64_t> objectCount = {};
     std::optional<std::uint64_t> tableOffset = {};
 
     Bytes bytes() const {
         Bytes list = fromHex("62 70 6C 69 73 74 30 30");
-        std::vector<std::uint64_t> places;
-        for (const auto object : objects) {
-            places.push_back(list.size());
-            append(list, fromHex(object));
+        std::vector<std::uint64_t> places(objects.size());
+        for (std::size_t at = 0; at < objects.size(); ++at) {
+            places.at(numbers.empty() ? at : numbers.at(at)) = list.size();
+            append(list, fromHex(objects[at]));
         }
         const std::uint64_t table = list.size();
         for (const std::uint64_t offset : offsets.value_or(places))

@@ -17,10 +17,10 @@ using Dictionary = PropertyList::Dictionary;
 TEST(BinaryPropertyListTest, IsMagicObjectsOffsetsAndTrailer) {
     const Bytes whole = fromHex(
         "62 70 6C 69 73 74 30 30"  // bplist00
-        "D1 01 02"                 // 8: one entry, key 1, value 2
-        "51 61"                    // 11: a
-        "09"                       // 13: true
-        "08 0B 0D"                 // 14: where they are
+        "51 61"                    // 8: number 1, a
+        "09"                       // 10: number 2, true
+        "D1 01 02"                 // 11: number 0, one entry, key 1, value 2
+        "0B 08 0A"                 // 14: where they are
         "00 00 00 00 00 00"        // unused
         "01 01"                    // widths of offsets and of references
         "00 00 00 00 00 00 00 03"  // how many objects
@@ -36,7 +36,8 @@ TEST(BinaryPropertyListTest, IsMagicObjectsOffsetsAndTrailer) {
 struct Example {
     const char* why;
     PropertyList value;
-    std::vector<std::string_view> objects;
+    std::vector<std::string_view> objects;   // in the order in which they lie
+    std::vector<std::size_t> numbers = {0};  // theirs
 };
 
 const Example kScalars[] = {
@@ -77,36 +78,51 @@ const Example kScalars[] = {
     {"a pair of surrogates counts as two", "\xF0\x9F\x92\xB3", {"62 D8 3D DC B3"}},
 };
 
+// Scalars lie in front, so that how wide a reference is need not be known until all are there.
 const Example kCollections[] = {
     {"an empty array", Array{}, {"A0"}},
-    {"one element", Array{1}, {"A1 01", "10 01"}},
+    {"one element", Array{1}, {"10 01", "A1 01"}, {1, 0}},
     {"an empty dictionary", Dictionary{}, {"D0"}},
-    {"one entry", Dictionary{{"a", 1}}, {"D1 01 02", "51 61", "10 01"}},
+    {"one entry", Dictionary{{"a", 1}}, {"51 61", "10 01", "D1 01 02"}, {1, 2, 0}},
     {"entries keep their order, all keys before all values",
      Dictionary{{"b", 1}, {"a", 2}},
-     {"D2 01 02 03 04", "51 62", "51 61", "10 01", "10 02"}},
-    {"equal scalars are one object",
-     Array{"x", "x", true, true, 1, 1, Bytes{1}, Bytes{1}, 2.5, 2.5},
-     {"AA 01 01 02 02 03 03 04 04 05 05", "51 78", "09", "10 01", "41 01",
-      "23 40 04 00 00 00 00 00 00"}},
-    {"scalars of different kinds are not",
+     {"51 62", "51 61", "10 01", "10 02", "D2 01 02 03 04"},
+     {1, 2, 3, 4, 0}},
+    {"equal texts, bytes and booleans are one object",
+     Array{"x", "x", true, true, Bytes{1}, Bytes{1}, false, false},
+     {"51 78", "09", "41 01", "08", "A8 01 01 02 02 03 03 04 04"},
+     {1, 2, 3, 4, 0}},
+    {"equal numbers and dates are objects of their own",
+     Array{1, 1, 2.5, 2.5, Date{0}, Date{0}},
+     {"10 01", "10 01", "23 40 04 00 00 00 00 00 00", "23 40 04 00 00 00 00 00 00",
+      "33 00 00 00 00 00 00 00 00", "33 00 00 00 00 00 00 00 00", "A6 01 02 03 04 05 06"},
+     {1, 2, 3, 4, 5, 6, 0}},
+    {"scalars of different kinds are never one",
      Array{1, true, "1", Bytes{'1'}, Date{0}, 0.0},
-     {"A6 01 02 03 04 05 06", "10 01", "09", "51 31", "41 31", "33 00 00 00 00 00 00 00 00",
-      "23 00 00 00 00 00 00 00 00"}},
-    {"a key shares its object with an equal value", Dictionary{{"a", "a"}}, {"D1 01 01", "51 61"}},
+     {"10 01", "09", "51 31", "41 31", "33 00 00 00 00 00 00 00 00", "23 00 00 00 00 00 00 00 00",
+      "A6 01 02 03 04 05 06"},
+     {1, 2, 3, 4, 5, 6, 0}},
+    {"a key shares its object with an equal value",
+     Dictionary{{"a", "a"}},
+     {"51 61", "D1 01 01"},
+     {1, 0}},
     {"equal collections are objects of their own",
      Array{Array{}, Array{}},
-     {"A2 01 02", "A0", "A0"}},
-    {"contents come behind what holds them",
+     {"A2 01 02", "A0", "A0"},
+     {0, 1, 2}},
+    {"contents are numbered behind what holds them",
      Dictionary{{"k", Array{true}}, {"l", false}},
-     {"D2 01 02 03 05", "51 6B", "51 6C", "A1 04", "09", "08"}},
+     {"51 6B", "51 6C", "09", "08", "D2 01 02 03 05", "A1 04"},
+     {1, 2, 4, 5, 0, 3}},
     {"fifteen elements need a long count",
      Array(15, true),
-     {"AF 10 0F 01 01 01 01 01 01 01 01 01 01 01 01 01 01 01", "09"}},
+     {"09", "AF 10 0F 01 01 01 01 01 01 01 01 01 01 01 01 01 01 01"},
+     {1, 0}},
 };
 
 void expectBothWays(const Example& example) {
-    const Bytes expected = BinaryList{.objects = example.objects}.bytes();
+    const Bytes expected =
+        BinaryList{.objects = example.objects, .numbers = example.numbers}.bytes();
 
     EXPECT_EQ(writeBinaryPropertyList(example.value), expected) << example.why;
     EXPECT_EQ(readPropertyList(expected), example.value) << example.why;
@@ -124,12 +140,14 @@ TEST(BinaryPropertyListTest, CountsEntriesOfALongDictionary) {
     Dictionary dictionary;
     for (char letter = 'a'; letter < 'a' + 15; ++letter)
         dictionary.append(std::string(1, letter), true);
+    constexpr std::string_view entries =
+        "DF 10 0F 01 02 03 04 05 06 07 08 09 0A 0B 0C 0D 0E 0F"
+        "10 10 10 10 10 10 10 10 10 10 10 10 10 10 10";
     expectBothWays({"fifteen entries, one value",
                     dictionary,
-                    {"DF 10 0F 01 02 03 04 05 06 07 08 09 0A 0B 0C 0D 0E 0F"
-                     "10 10 10 10 10 10 10 10 10 10 10 10 10 10 10",
-                     "51 61", "51 62", "51 63", "51 64", "51 65", "51 66", "51 67", "51 68",
-                     "51 69", "51 6A", "51 6B", "51 6C", "51 6D", "51 6E", "51 6F", "09"}});
+                    {"51 61", "51 62", "51 63", "51 64", "51 65", "51 66", "51 67", "51 68",
+                     "51 69", "51 6A", "51 6B", "51 6C", "51 6D", "51 6E", "51 6F", "09", entries},
+                    {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 0}});
 }
 
 // An array of so many different numbers, each of them an object of three bytes or less.

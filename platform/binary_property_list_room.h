@@ -1,0 +1,28 @@
+// The room that a value needs at the most as a binary property list, counted before anything is
+// written: so nothing that is too large is begun, and nothing moves while it is written.
+
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+
+#include "platform/binary_property_list.h"
+
+namespace vlm::platform::binary_format {
+
+struct Room {
+    std::size_t scalars = 0;
+    std::size_t sharable = 0;  // of them, texts and bytes
+    std::size_t collections = 0;
+    std::size_t references = 0;
+    std::size_t contents = 0;  // bytes of scalars, and of the collections' markers and counts
+
+    std::size_t objects() const { return scalars + collections; }
+    std::size_t bytes() const;  // of the whole list
+};
+
+// None for a value that is not within the limits.
+std::optional<Room> roomFor(const PropertyList& value, const PropertyListLimits& limits);
+
+}  // namespace vlm::platform::binary_format
