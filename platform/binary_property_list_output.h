@@ -10,6 +10,7 @@
 #include <string_view>
 
 #include "platform/binary_property_list.h"
+#include "platform/property_list.h"
 
 namespace vlm::platform::binary_format {
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "platform/binary_property_list_output.h"
+#include "platform/property_list_reading.h"
 
 namespace vlm::platform::binary_format {
 
@@ -71,7 +72,7 @@ private:
     }
 
     const PropertyListLimits& _limits;
-    Budget _budget;
+    PropertyListBudget _budget;
     Room _room;
 };
 

@@ -8,6 +8,7 @@
 #include <string>
 
 #include "platform/binary_property_list.h"
+#include "platform/property_list.h"
 
 namespace vlm::platform::binary_format {
 
