@@ -26,8 +26,7 @@ TEST(PropertyListRoomTest, IsNeverSmallerThanTheListOfARandomValue) {
 }
 
 TEST(PropertyListRoomTest, IsNeverSmallerThanTheListWhereAWidthChanges) {
-    for (const std::size_t count : {0, 1, 14, 15, 127, 128, 250, 254, 255, 256, 257, 32767, 32768,
-                                    65500, 65534, 65535, 65536, 65537}) {
+    for (const std::size_t count : {0, 1, 14, 15, 127, 128, 254, 255, 256, 65535, 65536}) {
         std::string accented;
         std::string paired;
         Dictionary dictionary;
