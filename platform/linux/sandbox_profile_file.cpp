@@ -5,6 +5,7 @@
 
 #include <cerrno>
 #include <filesystem>
+#include <memory>
 #include <optional>
 #include <string>
 #include <system_error>
@@ -34,11 +35,13 @@ std::optional<std::string> readSmallFile(const std::string& path, std::string& e
         error = "not a plain file";
         return std::nullopt;
     }
-    // One byte more than allowed tells a file that is too large from one that just fits.
-    std::string content(kLargestProfile + 1, '\0');
+    // One byte more than allowed tells a file that is too large from one that just fits. The room
+    // is not cleared: a profile needs a page or two of it.
+    constexpr std::size_t kRoom = kLargestProfile + 1;
+    const auto content = std::make_unique_for_overwrite<char[]>(kRoom);
     std::size_t size = 0;
-    while (size < content.size()) {
-        const ssize_t count = read(file.get(), content.data() + size, content.size() - size);
+    while (size < kRoom) {
+        const ssize_t count = read(file.get(), content.get() + size, kRoom - size);
         if (count == 0) break;
         if (count < 0 && errno == EINTR) continue;
         if (count < 0) {
@@ -51,8 +54,7 @@ std::optional<std::string> readSmallFile(const std::string& path, std::string& e
         error = text("larger than {} bytes", kLargestProfile);
         return std::nullopt;
     }
-    content.resize(size);
-    return content;
+    return std::string(content.get(), size);
 }
 
 }  // namespace

@@ -118,9 +118,15 @@ std::optional<std::string> accountHomeFolder() {
     return std::string(found->pw_dir);
 }
 
-UserPlaces UserPlaces::ofThisProcess() {
+UserPlaces UserPlaces::ofThisEnvironment() {
     return {environmentFolder("XDG_RUNTIME_DIR"), environmentFolder("XDG_CACHE_HOME"),
-            environmentFolder("HOME"), accountHomeFolder(), environmentFolder("XDG_CONFIG_HOME")};
+            environmentFolder("HOME"), std::nullopt, environmentFolder("XDG_CONFIG_HOME")};
+}
+
+UserPlaces UserPlaces::ofThisProcess() {
+    auto places = ofThisEnvironment();
+    places.accountHome = accountHomeFolder();
+    return places;
 }
 
 FolderAnswer userTemporaryFolder(const UserPlaces& from) {

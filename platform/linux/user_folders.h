@@ -30,6 +30,7 @@ struct UserPlaces {
     std::optional<std::string> accountHome;             // of the effective user's account
     std::optional<std::string> configurationHome = {};  // XDG_CONFIG_HOME
 
+    static UserPlaces ofThisEnvironment();  // without the account
     static UserPlaces ofThisProcess();
 };
 

@@ -61,15 +61,8 @@ Ended Machine::vlmbind(std::vector<std::string> arguments, std::optional<uid_t> 
 
 Ended Machine::run(std::vector<std::string> command, std::optional<uid_t> user,
                    Child::Environment variables) {
-    // Each user has a home of their own, where the tool makes its private folders.
-    const auto home = _folder.path() / ("home-" + std::to_string(user.value_or(getuid())));
-    std::filesystem::create_directories(home);
-    if (user) {
-        EXPECT_EQ(chown(home.c_str(), *user, *user), 0);
-    }
-
     Child::Options options{environment(), user};
-    options.environment["HOME"] = home;
+    options.environment["HOME"] = homeOf(user);
     options.environment["XDG_CACHE_HOME"] = std::nullopt;
     options.environment["XDG_CONFIG_HOME"] = std::nullopt;
     options.environment["XDG_RUNTIME_DIR"] = std::nullopt;
@@ -78,6 +71,16 @@ Ended Machine::run(std::vector<std::string> command, std::optional<uid_t> user,
     for (auto& [name, value] : variables) options.environment[name] = value;
 
     return test::run(std::move(command), options);
+}
+
+// Each user has one of their own, where the tool makes its private folders.
+std::filesystem::path Machine::homeOf(std::optional<uid_t> user) const {
+    auto home = _folder.path() / ("home-" + std::to_string(user.value_or(getuid())));
+    std::filesystem::create_directories(home);
+    if (user) {
+        EXPECT_EQ(chown(home.c_str(), *user, *user), 0);
+    }
+    return home;
 }
 
 std::string Machine::listingOnceItShows(const std::string& text) {

@@ -36,6 +36,9 @@ public:
     Ended run(std::vector<std::string> command, std::optional<uid_t> user = std::nullopt,
               Child::Environment environment = {});
 
+    // The home folder of that user, made with its first use.
+    std::filesystem::path homeOf(std::optional<uid_t> user) const;
+
     // The listing, once it holds the text, or is empty for an empty one; or the last one after some
     // seconds. The service looks at software cards for news once a second.
     std::string listingOnceItShows(const std::string& text);
