@@ -10,7 +10,14 @@
 
 namespace vlm::fuzz {
 
-// Data that is read as a property list can be written, and is then read as the same value.
+// The reader of one format, whatever the data looks like: it answers a value or else a problem, a
+// sentence about a place within the data. The value can be written, and is then read as the same.
+bool binaryPropertyListIsSound(std::span<const std::uint8_t> data);
+bool xmlPropertyListIsSound(std::span<const std::uint8_t> data);
+bool textPropertyListIsSound(std::span<const std::uint8_t> data);
+
+// Data that is read as a property list of any format can be written in the binary one and, where it
+// came from XML, in XML, and is then read as the same value.
 bool propertyListRoundTrips(std::span<const std::uint8_t> data);
 
 // A reply with the data as its error entry has failed, with an error of the framework's domain

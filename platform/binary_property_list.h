@@ -4,25 +4,14 @@
 //         objects' offsets; a trailer of 32 bytes that says where the table and the top object are
 //         and how wide offsets and references are. All numbers are big-endian. Collections refer
 //         to their contents by number, so that several may share one object.
-// Errors: as in property_list.h.
 
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
-#include <optional>
-#include <span>
 #include <string_view>
 
-#include "platform/property_list.h"
-
-namespace vlm::platform {
-
-bool isBinaryPropertyList(std::span<const std::uint8_t> data);
-std::optional<PropertyList> readBinaryPropertyList(std::span<const std::uint8_t> data,
-                                                   const PropertyListLimits& limits);
-
-namespace binary_format {
+namespace vlm::platform::binary_format {
 
 inline constexpr std::string_view kMagic = "bplist00";
 inline constexpr std::size_t kTrailerSize = 32;
@@ -46,28 +35,4 @@ inline constexpr std::uint8_t kTrue = 0x9;
 inline constexpr std::uint8_t kDateWidth = 0x3;
 inline constexpr std::uint8_t kLongCount = 0xF;  // the count follows as an integer object
 
-// What the rest of a list may cost. Reader and writer charge alike, so that whatever is written
-// within some limits can be read within them.
-class Budget {
-public:
-    explicit Budget(const PropertyListLimits& limits)
-        : _objects(limits.objects), _bytes(limits.bytes) {}
-
-    // False when that many are no longer allowed.
-    bool takeObjects(std::uint64_t count) { return take(count, _objects); }
-    bool takeBytes(std::uint64_t count) { return take(count, _bytes); }
-
-private:
-    static bool take(std::uint64_t count, std::size_t& left) {
-        if (count > left) return false;
-        left -= static_cast<std::size_t>(count);
-        return true;
-    }
-
-    std::size_t _objects;
-    std::size_t _bytes;
-};
-
-}  // namespace binary_format
-
-}  // namespace vlm::platform
+}  // namespace vlm::platform::binary_format

@@ -4,7 +4,12 @@
 
 #pragma once
 
+#include <optional>
+#include <span>
+#include <string>
+
 #include "platform/binary_property_list.h"
+#include "platform/property_list.h"
 
 namespace vlm::platform::binary_format {
 

@@ -1,8 +1,9 @@
 #include <algorithm>
-#include <numeric>
 
 #include "platform/binary_property_list.h"
 #include "platform/binary_property_list_objects.h"
+#include "platform/property_list_reading.h"
+#include "platform/text.h"
 
 namespace vlm::platform {
 
@@ -20,8 +21,10 @@ struct Layout {
     Input offsets;
 };
 
-std::optional<Layout> readLayout(Input data) {
-    if (data.size() < kMagic.size() + kTrailerSize) return std::nullopt;
+std::optional<Layout> readLayout(Input data, FirstProblem& problem) {
+    const auto fail = [&](const char* sentence) { return problem.at(0, sentence); };
+    if (data.size() < kMagic.size() + kTrailerSize)
+        return fail("It is too short for a binary property list.");
     const Input trailer = data.last(kTrailerSize).subspan(kTrailerUnused);
     const Input beforeTrailer = data.first(data.size() - kTrailerSize);
 
@@ -33,61 +36,65 @@ std::optional<Layout> readLayout(Input data) {
     const std::uint64_t table = numberIn(trailer.subspan(18, 8));
 
     const auto isWidth = [](std::size_t width) { return width >= 1 && width <= 8; };
-    if (!isWidth(layout.offsetWidth) || !isWidth(layout.referenceWidth)) return std::nullopt;
-    if (table > beforeTrailer.size()) return std::nullopt;
+    if (!isWidth(layout.offsetWidth)) return fail("The trailer gives no width of offsets.");
+    if (!isWidth(layout.referenceWidth)) return fail("The trailer gives no width of references.");
+    if (table > beforeTrailer.size()) return fail("The trailer points beyond the data.");
     layout.objects = beforeTrailer.first(static_cast<std::size_t>(table));
     layout.offsets = beforeTrailer.subspan(static_cast<std::size_t>(table));
-    if (layout.objectCount > layout.offsets.size() / layout.offsetWidth) return std::nullopt;
+    if (layout.objectCount > layout.offsets.size() / layout.offsetWidth)
+        return fail("The trailer counts more objects than there are offsets.");
     return layout;
 }
 
-using Entries = std::vector<PropertyList::Dictionary::Entry>;
-
-// A key that comes more than once has its last value, in the place of the first. Found by sorting,
-// since a table of hashes would have its worst case chosen by whoever made the input.
-PropertyList asDictionary(Entries entries) {
-    std::vector<std::size_t> order(entries.size());
-    std::iota(order.begin(), order.end(), std::size_t{0});
-    std::ranges::sort(order, [&](std::size_t left, std::size_t right) {
-        const int difference = entries[left].first.compare(entries[right].first);
-        return difference != 0 ? difference < 0 : left < right;
-    });
-
-    std::vector<bool> repeats(entries.size());
-    for (std::size_t first = 0, at = 1; at < order.size(); ++at) {
-        if (entries[order[at]].first != entries[order[first]].first) {
-            first = at;
-            continue;
-        }
-        entries[order[first]].second = std::move(entries[order[at]].second);
-        repeats[order[at]] = true;
+const char* nameOf(Kind kind) {
+    switch (kind) {
+        case Kind::Constant:
+            return "a constant";
+        case Kind::Integer:
+            return "an integer";
+        case Kind::Real:
+            return "a real number";
+        case Kind::Date:
+            return "a date";
+        case Kind::Data:
+            return "data";
+        case Kind::Ascii:
+            return "ASCII text";
+        case Kind::Utf16:
+            return "UTF-16 text";
+        case Kind::Array:
+            return "an array";
+        case Kind::Dictionary:
+            return "a dictionary";
     }
-
-    PropertyList::Dictionary dictionary;
-    for (std::size_t at = 0; at < entries.size(); ++at)
-        if (!repeats[at])
-            dictionary.append(std::move(entries[at].first), std::move(entries[at].second));
-    return dictionary;
+    return "of an unknown kind";
 }
 
 // Makes values out of objects, from the top down. An object that is used twice is made twice, and
 // its contents with it; the budget bounds what that can add up to, and the depth ends every cycle.
 class Reader {
 public:
-    Reader(const Layout& layout, const PropertyListLimits& limits)
-        : _layout(layout), _limits(limits), _budget(limits) {}
+    Reader(const Layout& layout, const PropertyListLimits& limits, FirstProblem& problem)
+        : _layout(layout), _limits(limits), _budget(limits), _problem(problem) {}
 
     std::optional<PropertyList> read() {
-        if (!_budget.takeObjects(1)) return std::nullopt;
+        if (!_budget.takeObjects(1)) return fail(kTooManyObjects);
         return value(_layout.topObject, 0);
     }
 
 private:
-    std::optional<Object> object(std::uint64_t number) const {
-        if (number >= _layout.objectCount) return std::nullopt;
+    std::nullopt_t fail(std::string_view sentence) { return _problem.at(0, std::string(sentence)); }
+    std::nullopt_t failOf(std::uint64_t number, std::string_view complaint) {
+        return fail(text("Object {} {}", number, complaint));
+    }
+
+    std::optional<Object> object(std::uint64_t number) {
+        if (number >= _layout.objectCount)
+            return failOf(number, "is referred to, and there are not so many.");
         const auto entry = static_cast<std::size_t>(number) * _layout.offsetWidth;
         const std::uint64_t offset = numberIn(_layout.offsets.subspan(entry, _layout.offsetWidth));
-        if (offset < kMagic.size() || offset >= _layout.objects.size()) return std::nullopt;
+        if (offset < kMagic.size() || offset >= _layout.objects.size())
+            return failOf(number, "lies outside of the objects.");
         const Input bytes = _layout.objects.subspan(static_cast<std::size_t>(offset));
         return Object{static_cast<Kind>(bytes[0] >> 4U), static_cast<std::uint8_t>(bytes[0] & 0xFU),
                       bytes.subspan(1)};
@@ -96,43 +103,58 @@ private:
     std::optional<PropertyList> value(std::uint64_t number, std::size_t depth) {
         const auto found = object(number);
         if (!found) return std::nullopt;
-        switch (found->kind) {
+        auto value = valueOf(*found, depth);
+        if (!value) failAs(number, *found);
+        return value;
+    }
+
+    // What is said when nothing more exact has been said.
+    void failAs(std::uint64_t number, const Object& object) {
+        failOf(number, text("is {}, and is malformed or cut.", nameOf(object.kind)));
+    }
+
+    std::optional<PropertyList> valueOf(const Object& object, std::size_t depth) {
+        switch (object.kind) {
             case Kind::Constant:
-                return readConstant(*found);
+                return readConstant(object);
             case Kind::Integer:
-                return readInteger(*found);
+                return readInteger(object);
             case Kind::Real:
-                return readReal(*found);
+                return readReal(object);
             case Kind::Date:
-                return readDate(*found);
+                return readDate(object);
             case Kind::Data:
-                return data(*found);
+                return data(object);
             case Kind::Ascii:
             case Kind::Utf16:
-                return text(*found);
+                return string(object);
             case Kind::Array:
-                return array(*found, depth);
+                return array(object, depth);
             case Kind::Dictionary:
-                return dictionary(*found, depth);
+                return dictionary(object, depth);
         }
         return std::nullopt;
     }
 
     std::optional<PropertyList> data(const Object& object) {
         const auto bytes = readData(object);
-        if (!bytes || !_budget.takeBytes(bytes->size())) return std::nullopt;
+        if (!bytes) return std::nullopt;
+        if (!_budget.takeBytes(bytes->size())) return fail(kTooManyBytes);
         return PropertyList(Bytes(bytes->begin(), bytes->end()));
     }
 
-    std::optional<std::string> text(const Object& object) {
+    std::optional<std::string> string(const Object& object) {
         auto text = readText(object);
-        if (!text || !_budget.takeBytes(text->size())) return std::nullopt;
+        if (text && !_budget.takeBytes(text->size())) return fail(kTooManyBytes);
         return text;
     }
 
     std::optional<std::string> key(std::uint64_t number) {
         const auto found = object(number);
-        return found ? text(*found) : std::nullopt;
+        if (!found) return std::nullopt;
+        auto key = string(*found);
+        if (!key) failOf(number, "is a key, and not well-formed text.");
+        return key;
     }
 
     std::optional<PropertyList> array(Object object, std::size_t depth) {
@@ -152,7 +174,7 @@ private:
     std::optional<PropertyList> dictionary(Object object, std::size_t depth) {
         const auto count = takeCount(object, 2 * _layout.referenceWidth);
         if (!count || !enter(2 * *count, depth)) return std::nullopt;
-        Entries entries;
+        PropertyListEntries entries;
         entries.reserve(*count);
         for (std::size_t at = 0; at < *count; ++at) {
             auto name = key(reference(object, at));
@@ -161,14 +183,21 @@ private:
             if (!each) return std::nullopt;
             entries.emplace_back(std::move(*name), std::move(*each));
         }
-        return asDictionary(std::move(entries));
+        return dictionaryOf(std::move(entries));
     }
 
     // Whether one more collection, of so many contents, may be made at this depth. They are paid
     // for before any is made, so that memory set aside for collections that lie inside each other
     // never adds up to more than the budget.
     bool enter(std::size_t contents, std::size_t depth) {
-        return depth < _limits.depth && _budget.takeObjects(contents);
+        if (depth == _limits.depth) {
+            fail(kTooDeep);
+        } else if (!_budget.takeObjects(contents)) {
+            fail(kTooManyObjects);
+        } else {
+            return true;
+        }
+        return false;
     }
 
     std::uint64_t reference(const Object& collection, std::size_t at) const {
@@ -178,7 +207,8 @@ private:
 
     const Layout& _layout;
     const PropertyListLimits& _limits;
-    Budget _budget;
+    PropertyListBudget _budget;
+    FirstProblem& _problem;
 };
 
 }  // namespace
@@ -189,10 +219,11 @@ bool isBinaryPropertyList(Input data) {
                               [](std::uint8_t byte, char letter) { return char(byte) == letter; });
 }
 
-std::optional<PropertyList> readBinaryPropertyList(Input data, const PropertyListLimits& limits) {
-    const auto layout = readLayout(data);
-    if (!layout) return std::nullopt;
-    return Reader(*layout, limits).read();
+PropertyListReading readBinaryPropertyList(Input data, const PropertyListLimits& limits) {
+    FirstProblem problem;
+    const auto layout = readLayout(data, problem);
+    auto value = layout ? Reader(*layout, limits, problem).read() : std::nullopt;
+    return std::move(problem).with(std::move(value));
 }
 
 }  // namespace vlm::platform

@@ -3,6 +3,7 @@
 #include <map>
 
 #include "platform/binary_property_list.h"
+#include "platform/property_list_reading.h"
 #include "platform/utf.h"
 
 namespace vlm::platform {
@@ -206,7 +207,7 @@ private:
     }
 
     const PropertyListLimits& _limits;
-    Budget _budget;
+    PropertyListBudget _budget;
     std::vector<Object> _objects;
     std::map<std::string, std::size_t> _scalars;  // by encoding; objects point at its keys
 };

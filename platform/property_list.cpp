@@ -1,10 +1,7 @@
 #include "platform/property_list.h"
 
 #include <algorithm>
-#include <array>
 #include <limits>
-
-#include "platform/binary_property_list.h"
 
 namespace vlm::platform {
 
@@ -83,29 +80,6 @@ const PropertyList::Array* PropertyList::array() const { return std::get_if<Arra
 
 const PropertyList::Dictionary* PropertyList::dictionary() const {
     return std::get_if<Dictionary>(&_value);
-}
-
-namespace {
-
-// Every format that is read: how its data begins, and its reader.
-struct Format {
-    bool (*recognises)(std::span<const std::uint8_t> data);
-    std::optional<PropertyList> (*read)(std::span<const std::uint8_t> data,
-                                        const PropertyListLimits& limits);
-};
-
-constexpr std::array kFormats = {
-    Format{isBinaryPropertyList, readBinaryPropertyList},
-};
-
-}  // namespace
-
-std::optional<PropertyList> readPropertyList(std::span<const std::uint8_t> data,
-                                             const PropertyListLimits& limits) {
-    if (data.size() > limits.bytes) return std::nullopt;
-    for (const Format& format : kFormats)
-        if (format.recognises(data)) return format.read(data, limits);
-    return std::nullopt;
 }
 
 }  // namespace vlm::platform
