@@ -8,7 +8,6 @@
 
 namespace vlm::test {
 
-using tests::identity;
 
 namespace {
 
