@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include "random_values.h"
+#include "random_property_lists.h"
 
 namespace vlm::platform {
 namespace {
@@ -16,7 +16,7 @@ binary_format::Room roomFor(const PropertyList& value) {
 }
 
 TEST(PropertyListRoomTest, IsNeverSmallerThanTheListOfARandomValue) {
-    RandomValues values(20010102);
+    test::RandomPropertyLists values;
     for (int number = 0; number < 5000; ++number) {
         const PropertyList value = values.next();
         const auto list = writeBinaryPropertyList(value);

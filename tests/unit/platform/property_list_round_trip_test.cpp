@@ -4,7 +4,7 @@
 
 #include "fuzz/properties.h"
 #include "platform/property_list.h"
-#include "random_values.h"
+#include "random_property_lists.h"
 
 namespace vlm::platform {
 namespace {
@@ -13,7 +13,7 @@ using Array = PropertyList::Array;
 using Dictionary = PropertyList::Dictionary;
 
 TEST(PropertyListRoundTripTest, GivesBackWhatWasWritten) {
-    RandomValues values(20010101);
+    test::RandomPropertyLists values;
     for (int number = 0; number < 20000; ++number) {
         const PropertyList value = values.next();
         const auto data = writeBinaryPropertyList(value);
@@ -24,8 +24,20 @@ TEST(PropertyListRoundTripTest, GivesBackWhatWasWritten) {
     }
 }
 
+TEST(PropertyListRoundTripTest, GivesBackWhatWasWrittenInXml) {
+    test::RandomPropertyLists values(test::RandomPropertyLists::Of::WhatXmlHolds);
+    for (int number = 0; number < 5000; ++number) {
+        const PropertyList value = values.next();
+        const auto text = writeXmlPropertyList(value);
+        ASSERT_TRUE(text) << value.describe();
+        const auto again = readPropertyList(Bytes(text->begin(), text->end()));
+        ASSERT_EQ(again, value) << *text;
+        ASSERT_EQ(writeXmlPropertyList(*again), text);
+    }
+}
+
 TEST(PropertyListRoundTripTest, HoldsForWhateverIsStillReadOfABrokenList) {
-    RandomValues values(20010101);
+    test::RandomPropertyLists values;
     int stillRead = 0;
     for (int number = 0; number < 5000; ++number) {
         auto data = writeBinaryPropertyList(values.next()).value();

@@ -1,22 +1,31 @@
-// Random property lists of all kinds, the same for the same seed.
+// Values to write and to read back: random, and the same in every run.
 
 #pragma once
 
 #include <bit>
 #include <cstdint>
+#include <iterator>
 #include <random>
 #include <string>
 #include <string_view>
 
 #include "platform/property_list.h"
 
-namespace vlm::platform {
+namespace vlm::test {
 
-class RandomValues {
+class RandomPropertyLists {
 public:
-    explicit RandomValues(std::uint64_t seed) : _random(seed) {}
+    // Those that XML has a form for have no other dates than whole seconds, nor control characters.
+    enum class Of { Anything, WhatXmlHolds };
 
-    PropertyList next(int depth = 3) {
+    explicit RandomPropertyLists(Of kind = Of::Anything) : _isForXml(kind == Of::WhatXmlHolds) {}
+
+    using Array = platform::PropertyList::Array;
+    using Bytes = platform::Bytes;
+    using Date = platform::PropertyList::Date;
+    using Dictionary = platform::PropertyList::Dictionary;
+
+    platform::PropertyList next(int depth = 3) {
         switch (below(depth > 0 ? 10 : 8)) {
             case 0:
                 return below(2) == 1;
@@ -27,7 +36,7 @@ public:
             case 3:
                 return anyDouble();
             case 4:
-                return PropertyList::Date{anyDouble()};
+                return anyDate();
             case 5:
                 return anyBytes();
             case 6:
@@ -51,6 +60,13 @@ private:
         return number == number ? number : 0.5;  // what is no number does not equal itself
     }
 
+    Date anyDate() {
+        if (!_isForXml) return Date{anyDouble()};
+        constexpr std::int64_t kFirst = -63113904000;  // of the year 1
+        constexpr std::int64_t kEnd = 252423993600;    // of the year 9999
+        return Date{static_cast<double>(kFirst + static_cast<std::int64_t>(below(kEnd - kFirst)))};
+    }
+
     Bytes anyBytes() {
         Bytes bytes(below(20));
         for (auto& byte : bytes) byte = static_cast<std::uint8_t>(below(256));
@@ -62,31 +78,37 @@ private:
                                                            "Z",
                                                            "0",
                                                            "\n",
+                                                           "&",
+                                                           "<",
+                                                           "\r",
                                                            "\x7F",
                                                            "\xC2\x80",
                                                            "\xE6\xB0\xB4",
-                                                           "\xEF\xBF\xBF",
-                                                           "\xF0\x9F\x92\xB3"};
-        const std::uint64_t kinds = below(2) == 0 ? 5 : std::size(kCharacters);
+                                                           "\xF0\x9F\x92\xB3",
+                                                           "\x01",
+                                                           "\xEF\xBF\xBF"};
+        const std::uint64_t all = std::size(kCharacters) - (_isForXml ? 2 : 0);
+        const std::uint64_t kinds = below(2) == 0 ? 8 : all;
         std::string text;
         for (std::uint64_t left = below(20); left > 0; --left) text += kCharacters[below(kinds)];
         return text;
     }
 
-    PropertyList::Array anyArray(int depth) {
-        PropertyList::Array array;
+    Array anyArray(int depth) {
+        Array array;
         for (std::uint64_t left = below(8); left > 0; --left) array.push_back(next(depth));
         return array;
     }
 
-    PropertyList::Dictionary anyDictionary(int depth) {
-        PropertyList::Dictionary dictionary;
+    Dictionary anyDictionary(int depth) {
+        Dictionary dictionary;
         for (std::uint64_t left = below(8); left > 0; --left)
             dictionary.set(anyText(), next(depth));
         return dictionary;
     }
 
-    std::mt19937_64 _random;
+    bool _isForXml;
+    std::mt19937_64 _random{20010101};
 };
 
-}  // namespace vlm::platform
+}  // namespace vlm::test
