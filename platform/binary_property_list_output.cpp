@@ -6,16 +6,6 @@
 
 namespace vlm::platform::binary_format {
 
-bool isAscii(std::string_view text) {
-    std::uint64_t bits = 0;
-    for (; text.size() >= sizeof bits; text.remove_prefix(sizeof bits)) {
-        std::memcpy(&bits, text.data(), sizeof bits);
-        if ((bits & 0x8080808080808080U) != 0) return false;
-    }
-    return std::ranges::all_of(text,
-                               [](char byte) { return static_cast<unsigned char>(byte) < 0x80; });
-}
-
 bool putText(Cursor& output, const std::string& text) {
     if (isAscii(text)) {
         output.putCount(Kind::Ascii, text.size());

@@ -26,8 +26,6 @@ inline std::size_t countBytes(std::size_t count) {
     return count < kLongCount ? 1 : 1 + 1 + widthOf(count);
 }
 
-bool isAscii(std::string_view text);
-
 // Writes into memory that is known to be large enough.
 class Cursor {
 public:

@@ -4,6 +4,7 @@
 
 #include "platform/binary_property_list_output.h"
 #include "platform/property_list_reading.h"
+#include "platform/utf.h"
 
 namespace vlm::platform::binary_format {
 

@@ -1,35 +1,43 @@
 #include "platform/property_list_reading.h"
 
-#include <algorithm>
-#include <numeric>
+#include <span>
+
+#include "platform/seen_set.h"
 
 namespace vlm::platform {
 
-// Found by sorting, since a table of hashes would have its worst case chosen by whoever made the
-// input.
+namespace {
+
+// Whether all keys of a dictionary that is short enough for comparing each with each differ.
+bool isShortWithoutRepetition(const PropertyListEntries& entries) {
+    constexpr std::size_t kShort = 8;
+    if (entries.size() > kShort) return false;
+    for (auto entry = entries.begin(); entry != entries.end(); ++entry)
+        for (auto before = entries.begin(); before != entry; ++before)
+            if (before->first == entry->first) return false;
+    return true;
+}
+
+}  // namespace
+
 PropertyList dictionaryOf(PropertyListEntries entries) {
-    std::vector<std::size_t> order(entries.size());
-    std::iota(order.begin(), order.end(), std::size_t{0});
-    std::ranges::sort(order, [&](std::size_t left, std::size_t right) {
-        const int difference = entries[left].first.compare(entries[right].first);
-        return difference != 0 ? difference < 0 : left < right;
-    });
+    if (isShortWithoutRepetition(entries))
+        return PropertyList::Dictionary::ofDistinct(std::move(entries));
 
-    std::vector<bool> repeats(entries.size());
-    for (std::size_t first = 0, at = 1; at < order.size(); ++at) {
-        if (entries[order[at]].first != entries[order[first]].first) {
-            first = at;
-            continue;
-        }
-        entries[order[first]].second = std::move(entries[order[at]].second);
-        repeats[order[at]] = true;
+    PropertyListEntries distinct;
+    distinct.reserve(entries.size());
+    SeenSet seen(entries.size());
+    for (auto& [key, value] : entries) {
+        const std::span bytes(reinterpret_cast<const std::uint8_t*>(key.data()), key.size());
+        const auto next = static_cast<std::uint32_t>(distinct.size());
+        const auto first = seen.findOrAdd(
+            bytes, next, [&](std::uint32_t other) { return distinct[other].first == key; });
+        if (first == next)
+            distinct.emplace_back(std::move(key), std::move(value));
+        else
+            distinct[first].second = std::move(value);
     }
-
-    PropertyList::Dictionary dictionary;
-    for (std::size_t at = 0; at < entries.size(); ++at)
-        if (!repeats[at])
-            dictionary.append(std::move(entries[at].first), std::move(entries[at].second));
-    return dictionary;
+    return PropertyList::Dictionary::ofDistinct(std::move(distinct));
 }
 
 std::string quotedForPerson(std::string_view input) {
