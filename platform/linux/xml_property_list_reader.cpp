@@ -24,26 +24,22 @@ using namespace xml_format;
 constexpr unsigned kParseOptions =
     pugi::parse_cdata | pugi::parse_ws_pcdata | pugi::parse_declaration | pugi::parse_fragment;
 
-const char* describe(pugi::xml_parse_status status) {
-    switch (status) {
-        case pugi::status_bad_pi:
-            return "This processing instruction does not end, or is out of place.";
-        case pugi::status_bad_comment:
-            return "This comment does not end.";
-        case pugi::status_bad_cdata:
-            return "This CDATA section does not end.";
-        case pugi::status_bad_doctype:
-            return "This document type does not end, or is out of place.";
-        case pugi::status_bad_attribute:
-            return "This attribute is not well formed.";
-        case pugi::status_end_element_mismatch:
-            return "An element does not end where it should.";
-        case pugi::status_out_of_memory:
-            return "There is not enough memory to read it.";
-        default:
-            return "This is not well-formed XML.";
-    }
-}
+// What pugixml stumbles over. It tells the place where it gave up, which for something that does
+// not end is the end of everything; a person wants to see where that begins.
+struct Stumble {
+    pugi::xml_parse_status status;
+    std::string_view beginning;
+    const char* problem;
+};
+constexpr Stumble kStumbles[] = {
+    {pugi::status_bad_pi, "<?", "This instruction does not end, or is out of place."},
+    {pugi::status_bad_comment, "<!--", "This comment does not end."},
+    {pugi::status_bad_cdata, "<![CDATA[", "This CDATA section does not end."},
+    {pugi::status_bad_doctype, "<!DOCTYPE", "This document type does not end, or is out of place."},
+    {pugi::status_bad_attribute, "", "This attribute is not well formed."},
+    {pugi::status_end_element_mismatch, "", "An element does not end where it should."},
+    {pugi::status_out_of_memory, "", "There is not enough memory to read it."},
+};
 
 bool isText(pugi::xml_node node) {
     return node.type() == pugi::node_pcdata || node.type() == pugi::node_cdata;
@@ -82,6 +78,14 @@ private:
         return fail(offsetOf(node), sentence);
     }
 
+    std::nullopt_t fail(const pugi::xml_parse_result& result) {
+        const auto offset = std::min(static_cast<std::size_t>(result.offset), _text.size());
+        const auto stumble = std::ranges::find(kStumbles, result.status, &Stumble::status);
+        if (stumble == std::end(kStumbles)) return fail(offset, "This is not well-formed XML.");
+        const auto beginning = _text.rfind(stumble->beginning, offset);
+        return fail(std::min(beginning, offset), stumble->problem);
+    }
+
     // Of the bracket that opens an element; of the text itself.
     static std::size_t offsetOf(pugi::xml_node node) {
         const auto offset =
@@ -92,11 +96,13 @@ private:
 
     std::optional<PropertyList> document() {
         if (hasTooManyPieces(_text, _limits)) return fail(std::size_t{0}, kTooManyObjects);
+        // pugixml takes the last character for an end, and would not see that it is text.
         _parsed.assign(_text.begin(), _text.end());
+        _parsed.push_back('\n');
         pugi::xml_document document;
         const auto result = document.load_buffer_inplace(_parsed.data(), _parsed.size(),
                                                          kParseOptions, pugi::encoding_utf8);
-        if (!result) return fail(static_cast<std::size_t>(result.offset), describe(result.status));
+        if (!result) return fail(result);
 
         pugi::xml_node root;
         for (const pugi::xml_node node : document) {
