@@ -211,6 +211,16 @@ private:
     FirstProblem& _problem;
 };
 
+// A list without shared collections has no more values than bytes. With them, a few bytes could ask
+// for as many values as there may be at all; so what a list may cost grows with its length.
+PropertyListLimits limitsFor(Input data, PropertyListLimits limits) {
+    constexpr std::size_t kShort = 4096;
+    constexpr std::size_t kValuesOfByte = 8;
+    if (data.size() < limits.objects / kValuesOfByte)
+        limits.objects = std::min(limits.objects, kShort + data.size() * kValuesOfByte);
+    return limits;
+}
+
 }  // namespace
 
 bool isBinaryPropertyList(Input data) {
@@ -222,7 +232,8 @@ bool isBinaryPropertyList(Input data) {
 PropertyListReading readBinaryPropertyList(Input data, const PropertyListLimits& limits) {
     FirstProblem problem;
     const auto layout = readLayout(data, problem);
-    auto value = layout ? Reader(*layout, limits, problem).read() : std::nullopt;
+    const PropertyListLimits own = limitsFor(data, limits);
+    auto value = layout ? Reader(*layout, own, problem).read() : std::nullopt;
     return std::move(problem).with(std::move(value));
 }
 

@@ -1,5 +1,5 @@
 // PropertyList: one typed value (boolean, integer, real, text, bytes, date, array, dictionary),
-// and its binary serialisation.
+// and its serialisations: binary and XML, read and written, and the old text format, read.
 //
 // Shapes:   a dictionary keeps its entries in the order they were set; keys are UTF-8 text.
 //           Integers are whole 64-bit numbers, signed or unsigned; a boolean is never a number.
@@ -8,8 +8,11 @@
 // Errors:   reading answers none for anything that is not a well-formed list within the limits:
 //           no offset, count or length of the input is trusted. Writing answers none for a value
 //           that the format cannot hold (text that is not UTF-8) or that exceeds the limits.
-// Source:   the binary property-list format 1.0 ("bplist00": object table, offset table, trailer).
-// In tests: tests/unit/platform/{,binary_}property_list*_test.cpp, fuzz/property_list_fuzzer.cpp
+// Choice:   a key that comes more than once has its last value, in every format.
+// Source:   the binary property-list format 1.0 ("bplist00": object table, offset table, trailer);
+//           XML 1.0 with the elements plist, dict, key, array, string, integer, real, true, false,
+//           date and data. A document type is read over, and no entity of its own is expanded.
+// In tests: tests/unit/platform/*property_list*_test.cpp, fuzz/
 
 #pragma once
 
@@ -107,6 +110,8 @@ private:
         _value;
 };
 
+// What a list may cost. A binary list may cost no more than eight values a byte either, beyond the
+// first few thousand, however often it refers to the same ones.
 struct PropertyListLimits {
     std::size_t depth = 512;                     // arrays and dictionaries inside each other
     std::size_t objects = 1U << 20U;             // values made, each use of a shared one counted

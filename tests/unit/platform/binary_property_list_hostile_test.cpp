@@ -233,7 +233,8 @@ TEST(PropertyListLimitsTest, CountTheBytesThatValuesHoldWithEveryUse) {
 TEST(PropertyListLimitsTest, HoldListsThatBlowUpWhenExpanded) {
     EXPECT_FALSE(readPropertyList(nestedArrays(40, 2)));  // 2^40 values
     EXPECT_FALSE(readPropertyList(nestedArrays(500, 14)));
-    EXPECT_TRUE(readPropertyList(nestedArrays(19, 2)));  // 2^19 - 1 values
+    EXPECT_FALSE(readPropertyList(nestedArrays(14, 2)));  // 2^14 - 1 values of 165 bytes
+    EXPECT_TRUE(readPropertyList(nestedArrays(12, 2)));   // 2^12 - 1 values
 }
 
 // 600,000 references in an array whose first element is such an array again, 500 deep: what is
