@@ -1,6 +1,5 @@
 #include "platform/binary_property_list_objects.h"
 
-#include <algorithm>
 #include <bit>
 #include <limits>
 
@@ -27,10 +26,9 @@ std::optional<double> readDouble(Object object) {
 std::optional<std::string> readAscii(Object object) {
     const auto count = takeCount(object, 1);
     if (!count) return std::nullopt;
-    const Input text = object.rest.first(*count);
-    if (std::ranges::any_of(text, [](std::uint8_t byte) { return byte >= 0x80; }))
-        return std::nullopt;
-    return std::string(text.begin(), text.end());
+    const std::string_view text(reinterpret_cast<const char*>(object.rest.data()), *count);
+    if (!isAscii(text)) return std::nullopt;
+    return std::string(text);
 }
 
 std::optional<std::string> readUtf16(Object object) {

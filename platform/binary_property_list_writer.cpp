@@ -1,9 +1,8 @@
 #include <algorithm>
 #include <bit>
-#include <map>
 
 #include "platform/binary_property_list.h"
-#include "platform/property_list_reading.h"
+#include "platform/binary_property_list_numbering.h"
 #include "platform/utf.h"
 
 namespace vlm::platform {
@@ -19,204 +18,151 @@ std::size_t widthOf(std::uint64_t number) {
     return number <= 0xFFFFFFFF ? 4 : 8;
 }
 
-// Bytes with what the format puts into them. `Output` is Bytes for the list and std::string for
-// an object that is compared as a whole.
-template <typename Output>
-void putNumber(Output& output, std::uint64_t number, std::size_t width) {
-    for (std::size_t byte = width; byte-- > 0;)
-        output.push_back(static_cast<typename Output::value_type>(
-            static_cast<std::uint8_t>(number >> (byte * 8))));
+std::size_t referencesOf(const WrittenObject& object) {
+    if (object.kind == Kind::Array) return object.count;
+    return object.kind == Kind::Dictionary ? 2 * object.count : 0;
 }
 
-template <typename Output>
-void putMarker(Output& output, Kind kind, std::uint64_t lowerHalf) {
-    putNumber(output, (static_cast<std::uint64_t>(kind) << 4U) | lowerHalf, 1);
-}
-
-template <typename Output>
-void putInteger(Output& output, std::uint64_t number) {
-    const std::size_t width = widthOf(number);
-    putMarker(output, Kind::Integer, static_cast<std::uint64_t>(std::countr_zero(width)));
-    putNumber(output, number, width);
-}
-
-template <typename Output>
-void putCount(Output& output, Kind kind, std::size_t count) {
-    if (count < kLongCount) return putMarker(output, kind, count);
-    putMarker(output, kind, kLongCount);
-    putInteger(output, count);
-}
-
-// The 16-byte form, of which only the lower half is ever needed: eight bytes are read as signed.
-void putAboveSigned(std::string& output, std::uint64_t number) {
-    putMarker(output, Kind::Integer, 4);
-    putNumber(output, 0, 8);
-    putNumber(output, number, 8);
-}
-
-// The object of a text, ASCII where it is ASCII; none when it is not UTF-8.
-std::optional<std::string> encodeText(const std::string& text) {
-    const auto isAscii = [](char byte) { return static_cast<unsigned char>(byte) < 0x80; };
-    std::string object;
-    if (std::ranges::all_of(text, isAscii)) {
-        putCount(object, Kind::Ascii, text.size());
-        return object + text;
+std::size_t sizeOf(const WrittenObject& object, std::size_t referenceWidth) {
+    const std::size_t longCount = object.count < kLongCount ? 0 : 1 + widthOf(object.count);
+    switch (object.kind) {
+        case Kind::Constant:
+            return 1;
+        case Kind::Integer:
+            return 1 + (object.isAboveSigned ? 16 : widthOf(object.number));
+        case Kind::Real:
+        case Kind::Date:
+            return 1 + 8;
+        case Kind::Data:
+        case Kind::Ascii:
+            return 1 + longCount + object.count;
+        case Kind::Utf16:
+            return 1 + longCount + 2 * object.count;
+        case Kind::Array:
+        case Kind::Dictionary:
+            return 1 + longCount + referencesOf(object) * referenceWidth;
     }
-    const auto units = utf8ToUtf16(text);
-    if (!units) return std::nullopt;
-    putCount(object, Kind::Utf16, units->size());
-    for (const char16_t unit : *units) putNumber(object, unit, 2);
-    return object;
+    return 0;
 }
 
-void putDouble(std::string& output, Kind kind, double value) {
-    putMarker(output, kind, kDateWidth);
-    putNumber(output, std::bit_cast<std::uint64_t>(value), 8);
-}
-
-// The object of a value that is neither text nor a collection.
-std::string encodeScalar(const PropertyList& value) {
-    std::string object;
-    if (const auto boolean = value.boolean()) {
-        putMarker(object, Kind::Constant, *boolean ? kTrue : kFalse);
-    } else if (const auto integer = value.integer()) {
-        putInteger(object, static_cast<std::uint64_t>(*integer));
-    } else if (const auto above = value.unsignedInteger()) {
-        putAboveSigned(object, *above);
-    } else if (const auto real = value.real()) {
-        putDouble(object, Kind::Real, *real);
-    } else if (const auto date = value.date()) {
-        putDouble(object, Kind::Date, date->secondsSince2001);
-    } else if (const auto* bytes = value.bytes()) {
-        putCount(object, Kind::Data, bytes->size());
-        object.append(bytes->begin(), bytes->end());
-    }
-    return object;
-}
-
-class Writer {
+// Fills bytes from the front, which are as many as it takes.
+class Output {
 public:
-    explicit Writer(const PropertyListLimits& limits) : _limits(limits), _budget(limits) {}
+    explicit Output(std::span<std::uint8_t> rest) : _rest(rest) {}
 
-    std::optional<Bytes> write(const PropertyList& value) {
-        if (!_budget.takeObjects(1) || !add(value, 0)) return std::nullopt;
-        return serialise();
+    void putNumber(std::uint64_t number, std::size_t width) {
+        const auto place = take(width);
+        for (std::size_t at = width; at-- > 0; number >>= 8U)
+            place[at] = static_cast<std::uint8_t>(number);
     }
+
+    void putMarker(Kind kind, std::uint64_t lowerHalf) {
+        putNumber((static_cast<std::uint64_t>(kind) << 4U) | lowerHalf, 1);
+    }
+
+    void putInteger(std::uint64_t number) {
+        const std::size_t width = widthOf(number);
+        putMarker(Kind::Integer, static_cast<std::uint64_t>(std::countr_zero(width)));
+        putNumber(number, width);
+    }
+
+    void putCount(Kind kind, std::size_t count) {
+        if (count < kLongCount) return putMarker(kind, count);
+        putMarker(kind, kLongCount);
+        putInteger(count);
+    }
+
+    void putBytes(std::string_view bytes) { std::ranges::copy(bytes, take(bytes.size()).begin()); }
 
 private:
-    // A scalar, encoded once for all values that are equal to it, or a collection's references.
-    struct Object {
-        const std::string* scalar = nullptr;
-        Kind kind = Kind::Array;
-        std::vector<std::size_t> references;
-    };
-
-    // Adds the value with all that it holds and answers its number. Numbers are given on first
-    // sight, a collection's before those of its contents, so the top object is number 0.
-    std::optional<std::size_t> add(const PropertyList& value, std::size_t depth) {
-        if (const auto* array = value.array()) {
-            const auto number = addCollection(Kind::Array, array->size(), depth);
-            return number && addContents(*number, *array, depth + 1) ? number : std::nullopt;
-        }
-        if (const auto* dictionary = value.dictionary()) {
-            const auto number = addCollection(Kind::Dictionary, 2 * dictionary->size(), depth);
-            return number && addContents(*number, *dictionary, depth + 1) ? number : std::nullopt;
-        }
-        if (const auto* text = value.text()) return addText(*text);
-        if (const auto* bytes = value.bytes(); bytes && !_budget.takeBytes(bytes->size()))
-            return std::nullopt;
-        return addScalar(encodeScalar(value));
+    std::span<std::uint8_t> take(std::size_t count) {
+        const auto front = _rest.first(count);
+        _rest = _rest.subspan(count);
+        return front;
     }
 
-    std::optional<std::size_t> addCollection(Kind kind, std::size_t references, std::size_t depth) {
-        if (depth == _limits.depth || !_budget.takeObjects(references)) return std::nullopt;
-        _objects.push_back({nullptr, kind, {}});
-        _objects.back().references.reserve(references);
-        return _objects.size() - 1;
-    }
-
-    bool addContents(std::size_t number, const PropertyList::Array& array, std::size_t depth) {
-        return std::ranges::all_of(
-            array, [&](const PropertyList& each) { return refer(number, add(each, depth)); });
-    }
-
-    // All keys come before all values.
-    bool addContents(std::size_t number, const PropertyList::Dictionary& dictionary,
-                     std::size_t depth) {
-        return std::ranges::all_of(
-                   dictionary,
-                   [&](const auto& entry) { return refer(number, addText(entry.first)); }) &&
-               std::ranges::all_of(dictionary, [&](const auto& entry) {
-                   return refer(number, add(entry.second, depth));
-               });
-    }
-
-    bool refer(std::size_t from, std::optional<std::size_t> to) {
-        if (to) _objects[from].references.push_back(*to);
-        return to.has_value();
-    }
-
-    std::optional<std::size_t> addText(const std::string& text) {
-        if (!_budget.takeBytes(text.size())) return std::nullopt;
-        auto object = encodeText(text);
-        if (!object) return std::nullopt;
-        return addScalar(std::move(*object));
-    }
-
-    std::size_t addScalar(std::string object) {
-        const auto [known, isNew] = _scalars.try_emplace(std::move(object), _objects.size());
-        if (isNew) _objects.push_back({&known->first, {}, {}});
-        return known->second;
-    }
-
-    std::optional<Bytes> serialise() const {
-        // Some readers ask that the number of objects and the table's own offset fit as well.
-        const std::size_t referenceWidth = widthOf(_objects.size());
-        Bytes output(kMagic.begin(), kMagic.end());
-        std::vector<std::size_t> offsets;
-        offsets.reserve(_objects.size());
-        for (const Object& object : _objects) {
-            if (output.size() > _limits.bytes) return std::nullopt;
-            offsets.push_back(output.size());
-            put(output, object, referenceWidth);
-        }
-
-        const std::size_t table = output.size();
-        const std::size_t offsetWidth = widthOf(table);
-        for (const std::size_t offset : offsets) putNumber(output, offset, offsetWidth);
-
-        putNumber(output, 0, kTrailerUnused);
-        putNumber(output, offsetWidth, 1);
-        putNumber(output, referenceWidth, 1);
-        putNumber(output, _objects.size(), 8);
-        putNumber(output, 0, 8);
-        putNumber(output, table, 8);
-        if (output.size() > _limits.bytes) return std::nullopt;
-        return output;
-    }
-
-    static void put(Bytes& output, const Object& object, std::size_t referenceWidth) {
-        if (object.scalar) {
-            output.insert(output.end(), object.scalar->begin(), object.scalar->end());
-            return;
-        }
-        const std::size_t count = object.references.size();
-        putCount(output, object.kind, object.kind == Kind::Dictionary ? count / 2 : count);
-        for (const std::size_t reference : object.references)
-            putNumber(output, reference, referenceWidth);
-    }
-
-    const PropertyListLimits& _limits;
-    PropertyListBudget _budget;
-    std::vector<Object> _objects;
-    std::map<std::string, std::size_t> _scalars;  // by encoding; objects point at its keys
+    std::span<std::uint8_t> _rest;
 };
+
+// The 16-byte form, of which only the lower half is ever needed: eight bytes are read as signed.
+void putAboveSigned(Output& output, std::uint64_t number) {
+    output.putMarker(Kind::Integer, 4);
+    output.putNumber(0, 8);
+    output.putNumber(number, 8);
+}
+
+void putUtf16(Output& output, const WrittenObject& text) {
+    output.putCount(text.kind, text.count);
+    for (const char16_t unit : utf8ToUtf16(text.bytes()).value_or(u"")) output.putNumber(unit, 2);
+}
+
+void putReferences(Output& output, std::span<const std::uint32_t> references, std::size_t width) {
+    for (const std::uint32_t reference : references) output.putNumber(reference, width);
+}
+
+void put(Output& output, const WrittenObject& object, const WrittenObjects& written,
+         std::size_t referenceWidth) {
+    switch (object.kind) {
+        case Kind::Constant:
+            return output.putMarker(object.kind, object.number);
+        case Kind::Integer:
+            return object.isAboveSigned ? putAboveSigned(output, object.number)
+                                        : output.putInteger(object.number);
+        case Kind::Real:
+        case Kind::Date:
+            output.putMarker(object.kind, kDateWidth);
+            return output.putNumber(object.number, 8);
+        case Kind::Data:
+        case Kind::Ascii:
+            output.putCount(object.kind, object.count);
+            return output.putBytes(object.bytes());
+        case Kind::Utf16:
+            return putUtf16(output, object);
+        case Kind::Array:
+        case Kind::Dictionary:
+            output.putCount(object.kind, object.count);
+            return putReferences(
+                output, std::span(written.references).subspan(object.number, referencesOf(object)),
+                referenceWidth);
+    }
+}
 
 }  // namespace
 
 std::optional<Bytes> writeBinaryPropertyList(const PropertyList& value,
                                              const PropertyListLimits& limits) {
-    return Writer(limits).write(value);
+    const auto written = numberObjects(value, limits);
+    if (!written) return std::nullopt;
+    const auto& objects = written->objects;
+
+    // Some readers ask that the number of objects and the table's own offset fit as well.
+    const std::size_t referenceWidth = widthOf(objects.size());
+    std::size_t table = kMagic.size();
+    for (const WrittenObject& object : objects) table += sizeOf(object, referenceWidth);
+    const std::size_t offsetWidth = widthOf(table);
+    const std::size_t tableSize = objects.size() * offsetWidth;
+    const std::size_t size = table + tableSize + kTrailerSize;
+    if (size > limits.bytes) return std::nullopt;
+
+    Bytes bytes(size);
+    const std::span whole(bytes);
+    Output output(whole.first(table));
+    Output offsets(whole.subspan(table, tableSize));
+    Output trailer(whole.last(kTrailerSize));
+    output.putBytes(kMagic);
+    std::size_t offset = kMagic.size();
+    for (const WrittenObject& object : objects) {
+        offsets.putNumber(offset, offsetWidth);
+        put(output, object, *written, referenceWidth);
+        offset += sizeOf(object, referenceWidth);
+    }
+    trailer.putNumber(0, kTrailerUnused);
+    trailer.putNumber(offsetWidth, 1);
+    trailer.putNumber(referenceWidth, 1);
+    trailer.putNumber(objects.size(), 8);
+    trailer.putNumber(0, 8);
+    trailer.putNumber(table, 8);
+    return bytes;
 }
 
 }  // namespace vlm::platform

@@ -9,6 +9,12 @@ PropertyList::Dictionary::Dictionary(std::initializer_list<Entry> entries) {
     for (const auto& [key, value] : entries) set(key, value);
 }
 
+PropertyList::Dictionary PropertyList::Dictionary::ofDistinct(std::vector<Entry> entries) {
+    Dictionary dictionary;
+    dictionary._entries = std::move(entries);
+    return dictionary;
+}
+
 const PropertyList* PropertyList::Dictionary::find(std::string_view key) const {
     const auto entry = std::ranges::find(_entries, key, &Entry::first);
     return entry == _entries.end() ? nullptr : &entry->second;

@@ -51,6 +51,9 @@ public:
         Dictionary() = default;
         Dictionary(std::initializer_list<Entry> entries);
 
+        // Of entries whose keys are known to differ.
+        static Dictionary ofDistinct(std::vector<Entry> entries);
+
         // The value under the key; null when there is none. Valid until the next change.
         const PropertyList* find(std::string_view key) const;
 

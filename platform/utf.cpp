@@ -1,6 +1,7 @@
 #include "platform/utf.h"
 
 #include <cstdint>
+#include <cstring>
 
 namespace vlm::platform {
 
@@ -70,6 +71,18 @@ Utf8Character encodeUtf8(char32_t character) {
     if (character < kFirstSupplementary)
         return {{lead(0xE0U | (character >> 12U)), following(6), following(0)}, 3};
     return {{lead(0xF0U | (character >> 18U)), following(12), following(6), following(0)}, 4};
+}
+
+// Eight at a time, since nearly every text is ASCII and all of it has to be looked at.
+bool isAscii(std::string_view text) {
+    std::uint64_t all = 0;
+    std::uint64_t eight = 0;
+    for (; text.size() >= sizeof eight; text.remove_prefix(sizeof eight)) {
+        std::memcpy(&eight, text.data(), sizeof eight);
+        all |= eight;
+    }
+    for (const char byte : text) all |= static_cast<unsigned char>(byte);
+    return (all & 0x8080808080808080U) == 0;
 }
 
 std::optional<std::string> utf16ToUtf8(std::u16string_view text) {

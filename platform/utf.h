@@ -36,6 +36,8 @@ struct Utf8Character {
 
 Utf8Character encodeUtf8(char32_t character);
 
+bool isAscii(std::string_view text);
+
 // Whole texts; none when any piece is ill formed.
 std::optional<std::string> utf16ToUtf8(std::u16string_view text);
 std::optional<std::u16string> utf8ToUtf16(std::string_view text);
