@@ -48,7 +48,9 @@ std::size_t sizeOf(const WrittenObject& object, std::size_t referenceWidth) {
 // Fills bytes from the front, which are as many as it takes.
 class Output {
 public:
-    explicit Output(std::span<std::uint8_t> rest) : _rest(rest) {}
+    explicit Output(std::span<std::uint8_t> bytes) : _bytes(bytes) {}
+
+    std::size_t written() const { return _written; }
 
     void putNumber(std::uint64_t number, std::size_t width) {
         const auto place = take(width);
@@ -76,12 +78,13 @@ public:
 
 private:
     std::span<std::uint8_t> take(std::size_t count) {
-        const auto front = _rest.first(count);
-        _rest = _rest.subspan(count);
-        return front;
+        const auto place = _bytes.subspan(_written, count);
+        _written += count;
+        return place;
     }
 
-    std::span<std::uint8_t> _rest;
+    std::span<std::uint8_t> _bytes;
+    std::size_t _written = 0;
 };
 
 // The 16-byte form, of which only the lower half is ever needed: eight bytes are read as signed.
@@ -150,11 +153,9 @@ std::optional<Bytes> writeBinaryPropertyList(const PropertyList& value,
     Output offsets(whole.subspan(table, tableSize));
     Output trailer(whole.last(kTrailerSize));
     output.putBytes(kMagic);
-    std::size_t offset = kMagic.size();
     for (const WrittenObject& object : objects) {
-        offsets.putNumber(offset, offsetWidth);
+        offsets.putNumber(output.written(), offsetWidth);
         put(output, object, *written, referenceWidth);
-        offset += sizeOf(object, referenceWidth);
     }
     trailer.putNumber(0, kTrailerUnused);
     trailer.putNumber(offsetWidth, 1);
