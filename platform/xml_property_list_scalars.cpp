@@ -69,23 +69,25 @@ void appendBytes(Bytes& bytes, std::uint32_t bits, std::size_t count) {
 }
 
 template <bool value>
-std::optional<PropertyList> boolean(std::string content) {
+std::optional<PropertyList> boolean(std::string_view content) {
     return isBlank(content) ? std::optional(PropertyList(value)) : std::nullopt;
 }
 
-const Scalar kScalars[] = {
-    {"string", [](std::string content) { return std::optional(PropertyList(std::move(content))); },
-     ""},
-    {"integer", [](std::string content) { return integerIn(content); },
-     "This is no integer of 64 bits."},
-    {"real", [](std::string content) -> std::optional<PropertyList> { return realIn(content); },
-     "This is no real number, or none that can be held."},
+template <auto read>
+std::optional<PropertyList> asList(std::string_view content) {
+    return read(content);
+}
+
+std::optional<std::string> string(std::string_view content) { return std::string(content); }
+
+constexpr Scalar kScalars[] = {
+    {"string", asList<string>, ""},
+    {"integer", integerIn, "This is no integer of 64 bits."},
+    {"real", asList<realIn>, "This is no real number, or none that can be held."},
     {"true", boolean<true>, "The element \"true\" holds no text."},
     {"false", boolean<false>, "The element \"false\" holds no text."},
-    {"date", [](std::string content) -> std::optional<PropertyList> { return dateIn(content); },
-     "This is no date such as 2001-01-31T23:59:59Z."},
-    {"data", [](std::string content) -> std::optional<PropertyList> { return base64In(content); },
-     "This is no Base64."},
+    {"date", asList<dateIn>, "This is no date such as 2001-01-31T23:59:59Z."},
+    {"data", asList<base64In>, "This is no Base64."},
 };
 
 }  // namespace

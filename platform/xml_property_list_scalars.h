@@ -34,7 +34,7 @@ bool isBlank(std::string_view text);
 // An element that holds its value as text, and what to say of one that does not.
 struct Scalar {
     std::string_view name;
-    std::optional<PropertyList> (*read)(std::string content);
+    std::optional<PropertyList> (*read)(std::string_view content);
     const char* problem;
 };
 const Scalar* scalarNamed(std::string_view element);

@@ -171,9 +171,9 @@ private:
         if (!kind)
             return fail(element,
                         text("No value is written as the element {}.", quotedForPerson(name)));
-        auto content = contentOf(element);
+        const auto content = contentOf(element);
         if (!content) return std::nullopt;
-        auto scalar = kind->read(std::move(*content));
+        auto scalar = kind->read(*content);
         if (!scalar) return fail(element, kind->problem);
         return scalar;
     }

@@ -7,7 +7,6 @@
 
 namespace vlm::test {
 
-
 using ::testing::HasSubstr;
 using ::testing::StartsWith;
 

@@ -8,7 +8,6 @@
 
 namespace vlm::test {
 
-
 using ::testing::HasSubstr;
 using ::testing::Not;
 

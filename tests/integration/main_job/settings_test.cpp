@@ -8,7 +8,6 @@
 
 namespace vlm::test {
 
-
 namespace {
 
 class Settings : public ::testing::Test {

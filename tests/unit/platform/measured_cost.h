@@ -61,11 +61,17 @@ inline std::optional<Cost> measured(const std::function<bool()>& work) {
 
 // How much more a build with sanitizers may take: they slow every access down and keep what was
 // freed.
-inline constexpr int kAllowance =
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-    10;
+#if defined(__has_feature)
+#define VLM_HAS_FEATURE(feature) __has_feature(feature)
 #else
-    1;
+#define VLM_HAS_FEATURE(feature) 0
 #endif
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__) || \
+    VLM_HAS_FEATURE(address_sanitizer) || VLM_HAS_FEATURE(thread_sanitizer)
+inline constexpr int kAllowance = 10;
+#else
+inline constexpr int kAllowance = 1;
+#endif
+#undef VLM_HAS_FEATURE
 
 }  // namespace vlm::test

@@ -4,7 +4,7 @@
 
 #include "fuzz/properties.h"
 #include "platform/property_list.h"
-#include "random_property_lists.h"
+#include "round_trips.h"
 
 namespace vlm::platform {
 namespace {
@@ -13,27 +13,11 @@ using Array = PropertyList::Array;
 using Dictionary = PropertyList::Dictionary;
 
 TEST(PropertyListRoundTripTest, GivesBackWhatWasWritten) {
-    test::RandomPropertyLists values;
-    for (int number = 0; number < 20000; ++number) {
-        const PropertyList value = values.next();
-        const auto data = writeBinaryPropertyList(value);
-        ASSERT_TRUE(data) << value.describe();
-        const auto again = readPropertyList(*data);
-        ASSERT_EQ(again, value) << value.describe();
-        ASSERT_EQ(writeBinaryPropertyList(*again), data) << value.describe();
-    }
+    test::expectThatBinaryListsRoundTrip(20000);
 }
 
 TEST(PropertyListRoundTripTest, GivesBackWhatWasWrittenInXml) {
-    test::RandomPropertyLists values(test::RandomPropertyLists::Of::WhatXmlHolds);
-    for (int number = 0; number < 5000; ++number) {
-        const PropertyList value = values.next();
-        const auto text = writeXmlPropertyList(value);
-        ASSERT_TRUE(text) << value.describe();
-        const auto again = readPropertyList(Bytes(text->begin(), text->end()));
-        ASSERT_EQ(again, value) << *text;
-        ASSERT_EQ(writeXmlPropertyList(*again), text);
-    }
+    test::expectThatXmlListsRoundTrip(5000);
 }
 
 TEST(PropertyListRoundTripTest, HoldsForWhateverIsStillReadOfABrokenList) {
