@@ -27,15 +27,16 @@ PropertyList dictionaryOf(PropertyListEntries entries) {
     PropertyListEntries distinct;
     distinct.reserve(entries.size());
     SeenSet seen(entries.size());
-    for (auto& [key, value] : entries) {
+    for (auto& entry : entries) {
+        const std::string& key = entry.first;
         const std::span bytes(reinterpret_cast<const std::uint8_t*>(key.data()), key.size());
         const auto next = static_cast<std::uint32_t>(distinct.size());
         const auto first = seen.findOrAdd(
             bytes, next, [&](std::uint32_t other) { return distinct[other].first == key; });
         if (first == next)
-            distinct.emplace_back(std::move(key), std::move(value));
+            distinct.push_back(std::move(entry));
         else
-            distinct[first].second = std::move(value);
+            distinct[first].second = std::move(entry.second);
     }
     return PropertyList::Dictionary::ofDistinct(std::move(distinct));
 }
