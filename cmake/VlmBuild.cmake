@@ -13,8 +13,18 @@ set(CMAKE_LIBRARY_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/lib")
 set(CMAKE_ARCHIVE_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/lib")
 
 # Programs find the library relative to themselves, so that a tree can be moved or copied whole.
-set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
-set(CMAKE_INSTALL_RPATH "$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+# What is built has the same path as what gets installed: CMake would otherwise fill it up with empty
+# elements, which stand for whatever folder a program is started in.
+set(CMAKE_BUILD_WITH_INSTALL_RPATH ON)
+set(CMAKE_INSTALL_RPATH "$ORIGIN/../lib")
+if(NOT CMAKE_INSTALL_LIBDIR STREQUAL "lib")
+    list(APPEND CMAKE_INSTALL_RPATH "$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+endif()
+
+# For a program that takes nothing from libvlm: its libraries come from the system alone.
+function(vlm_needs_no_libvlm target)
+    set_target_properties(${target} PROPERTIES INSTALL_RPATH "")
+endfunction()
 if(NOT CMAKE_BUILD_TYPE)
     set(CMAKE_BUILD_TYPE RelWithDebInfo)
 endif()
