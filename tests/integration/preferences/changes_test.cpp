@@ -159,6 +159,13 @@ TEST_F(PreferencesChangesTest, AFileThatDidNotChangeIsNotReadAgain) {
     EXPECT_EQ(::read(watch.get(), events.data(), events.size()), -1) << "it was opened";
 }
 
+// Sanitizers make every access several times as slow.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr double kMostMicroseconds = 400;
+#else
+constexpr double kMostMicroseconds = 20;
+#endif
+
 TEST_F(PreferencesChangesTest, AnAnswerTakesLessThanTwentyMicrosecondsWhenNothingChanged) {
     auto entries = List::Dictionary();
     for (int number = 0; number < 100; ++number)
@@ -178,7 +185,7 @@ TEST_F(PreferencesChangesTest, AnAnswerTakesLessThanTwentyMicrosecondsWhenNothin
     }
 
     RecordProperty("microseconds", std::to_string(best.count()));
-    EXPECT_LT(best.count(), 20);
+    EXPECT_LT(best.count(), kMostMicroseconds);
 }
 
 }  // namespace

@@ -96,12 +96,13 @@ int writePairs(const platform::PreferencesFolders& folders, int first) {
 
 TEST_F(PreferencesWritersTest, AWriterThatIsKilledLeavesTheFileWholeAndTheLockFree) {
     constexpr int kKills = 300;
+    constexpr int kMostKills = 3000;  // where a busy machine keeps writers from getting so far
     std::mt19937 random(std::random_device{}());
-    std::uniform_int_distribution<int> microseconds(0, 3000);
     FilePreferences preferences(world().folders());
     int killedWhileWriting = 0;
 
-    for (int kill = 0; kill < kKills; ++kill) {
+    for (int kill = 0; kill < kKills || (killedWhileWriting == 0 && kill < kMostKills); ++kill) {
+        std::uniform_int_distribution<int> microseconds(0, 3000 + 10 * kill);
         Forked writer([&] { return writePairs(world().folders(), kill * 10'000); });
         std::this_thread::sleep_for(std::chrono::microseconds(microseconds(random)));
         writer.kill();
