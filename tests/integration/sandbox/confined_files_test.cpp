@@ -1,7 +1,5 @@
 // What a confined program can still do with files.
 
-#include <linux/landlock.h>
-#include <sys/syscall.h>
 #include <unistd.h>
 
 #include "probe_test.h"
@@ -9,13 +7,6 @@
 namespace vlm::test {
 
 namespace {
-
-// The kernel's version of Landlock; 0 when it has none.
-int landlockVersion() {
-    const long version =
-        syscall(SYS_landlock_create_ruleset, nullptr, 0, LANDLOCK_CREATE_RULESET_VERSION);
-    return version > 0 ? static_cast<int>(version) : 0;
-}
 
 class ConfinedFilesTest : public ProbeTest {
 protected:

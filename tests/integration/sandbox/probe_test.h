@@ -6,6 +6,9 @@
 #pragma once
 
 #include <gtest/gtest.h>
+#include <linux/landlock.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -20,6 +23,13 @@
 #include "tests/integration/linux/temporary_folder.h"
 
 namespace vlm::test {
+
+// The kernel's version of Landlock; 0 when it has none.
+inline int landlockVersion() {
+    const long version =
+        syscall(SYS_landlock_create_ruleset, nullptr, 0, LANDLOCK_CREATE_RULESET_VERSION);
+    return version > 0 ? static_cast<int>(version) : 0;
+}
 
 // What a probe printed.
 struct Report {
