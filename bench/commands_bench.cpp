@@ -10,37 +10,16 @@
 
 #include <cstdio>
 #include <cstdlib>
-#include <filesystem>
 #include <string>
 #include <vector>
 
 #include "bench/interleaved.h"
+#include "bench/temporary_folder.h"
 
 namespace vlm::bench {
 namespace {
 
 constexpr uid_t kNobody = 65534;
-
-class HomeFolder {
-public:
-    HomeFolder() {
-        std::string pattern = std::filesystem::temp_directory_path() / "vlm-bench-XXXXXX";
-        if (mkdtemp(pattern.data()) == nullptr) std::exit(2);
-        _path = pattern;
-        if (getuid() == 0 && chown(_path.c_str(), kNobody, kNobody) != 0) std::exit(2);
-    }
-    ~HomeFolder() {
-        std::error_code ignored;
-        std::filesystem::remove_all(_path, ignored);
-    }
-    HomeFolder(const HomeFolder&) = delete;
-    HomeFolder& operator=(const HomeFolder&) = delete;
-
-    const std::filesystem::path& path() const { return _path; }
-
-private:
-    std::filesystem::path _path;
-};
 
 [[noreturn]] void becomeUserAndRun(std::vector<std::string> arguments, const std::string& home) {
     const int nothing = open("/dev/null", O_RDWR);
@@ -70,7 +49,8 @@ void run(const std::vector<std::string>& arguments, int expectedStatus, const st
 }
 
 bool measure(const std::string& vlmbind, const std::string& emptyProgram) {
-    const HomeFolder home;
+    const TemporaryFolder home;
+    if (getuid() == 0 && chown(home.path().c_str(), kNobody, kNobody) != 0) std::exit(2);
     const auto command = [&](std::vector<std::string> arguments, int status) {
         return [=, folder = home.path().string()] { run(arguments, status, folder); };
     };

@@ -7,8 +7,10 @@
 #include <string>
 
 #include "bench/interleaved.h"
+#include "bench/temporary_folder.h"
 #include "platform/linux/file_preferences.h"
 #include "platform/property_list.h"
+#include "settings/smartcard_settings.h"
 
 namespace vlm::bench {
 namespace {
@@ -35,6 +37,13 @@ void writeRecord(const PreferencesFolder& folder, int keys) {
     std::ofstream(folder.path() + "/" + kDomain + ".plist") << text.value();
 }
 
+bool reportTime(const char* what, std::chrono::duration<double> time) {
+    const bool reached = time < kMost;
+    std::printf("%-44s %9s | goal under %s %s\n", what, shown(time).c_str(), shown(kMost).c_str(),
+                reached ? "reached" : "MISSED");
+    return reached;
+}
+
 bool measure(const std::filesystem::path& parent) {
     const PreferencesFolders folders{folderIn(parent, "managed"), folderIn(parent, "machine"),
                                      folderIn(parent, "user")};
@@ -51,22 +60,19 @@ bool measure(const std::filesystem::path& parent) {
             {"forced", [&] { keep(preferences.isForced("UserPairing", kDomain)); }, 1000},
             {"machine",
              [&] { keep(preferences.value("UserPairing", kDomain, PreferencesUser::Any)); }, 1000},
+            {"setting", [] { keep(VLGetSmartcardSetting(String("UserPairing"))); }, 1000},
         },
         50);
-    const auto both = time[0] + time[1];
-    const bool reached = both < kMost;
-    std::printf("%-44s %9s | goal under %s %s\n", "a setting, nothing changed on the disk",
-                shown(both).c_str(), shown(kMost).c_str(), reached ? "reached" : "MISSED");
-    return reached;
+    const bool records = reportTime("a value of two records of 101 keys", time[0] + time[1]);
+    return reportTime("VLGetSmartcardSetting, as this machine has it", time[2]) && records;
 }
 
 }  // namespace
 }  // namespace vlm::bench
 
 int main() {
-    std::string parent = std::filesystem::temp_directory_path() / "vlm-bench-XXXXXX";
-    if (mkdtemp(parent.data()) == nullptr) return 2;
-    const bool reached = vlm::bench::measure(parent);
-    std::filesystem::remove_all(parent);
-    return reached ? 0 : 1;
+    // What the log costs is its receiver's matter.
+    setenv("VLM_LOG_TARGET", "none", 1);
+    const vlm::bench::TemporaryFolder folder;
+    return vlm::bench::measure(folder.path()) ? 0 : 1;
 }

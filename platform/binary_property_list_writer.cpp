@@ -175,7 +175,7 @@ private:
 std::optional<Bytes> writeBinaryPropertyList(const PropertyList& value,
                                              const PropertyListLimits& limits) {
     const auto room = roomFor(value, limits);
-    if (!room) return std::nullopt;
+    if (!room || room->objects() > SeenSet::kMostPieces) return std::nullopt;
     return Writer(*room).write(value, limits.bytes);
 }
 

@@ -23,6 +23,10 @@ bool looksLikeXml(std::string_view text) {
     return other != std::string_view::npos && isLetter(text[other]);
 }
 
+PropertyListFormat formatOf(std::string_view text) {
+    return looksLikeXml(text) ? PropertyListFormat::Xml : PropertyListFormat::Text;
+}
+
 PropertyListExamination examineBinary(std::span<const std::uint8_t> data,
                                       const PropertyListLimits& limits) {
     auto reading = readBinaryPropertyList(data, limits);
@@ -40,7 +44,7 @@ PropertyListExamination examineText(std::span<const std::uint8_t> data,
                                     const PropertyListLimits& limits) {
     const PropertyListSource source(data);
     PropertyListExamination found;
-    found.format = looksLikeXml(source.text()) ? PropertyListFormat::Xml : PropertyListFormat::Text;
+    found.format = formatOf(source.text());
     auto reading = readSource(source, found.format, limits);
     found.value = std::move(reading.value);
     if (found.value) return found;
@@ -56,13 +60,15 @@ PropertyListExamination examineText(std::span<const std::uint8_t> data,
 PropertyListExamination refuseAsTooLong(std::span<const std::uint8_t> data,
                                         const PropertyListLimits& limits) {
     constexpr std::size_t kHead = 256;
-    PropertyListExamination found = examineText(data.first(std::min(data.size(), kHead)), {});
-    found.value.reset();
+    PropertyListExamination found;
     found.problem = text("It is longer than {} bytes.", limits.bytes);
+    if (isBinaryPropertyList(data)) {
+        found.format = PropertyListFormat::Binary;
+        return found;
+    }
+    const PropertyListSource head(data.first(std::min(data.size(), kHead)));
+    found.format = formatOf(head.text());
     found.line = found.column = 1;
-    if (!isBinaryPropertyList(data)) return found;
-    found.format = PropertyListFormat::Binary;
-    found.line = found.column = 0;
     return found;
 }
 

@@ -2,7 +2,9 @@
 
 #include <span>
 
+#include "platform/harmless_text.h"
 #include "platform/seen_set.h"
+#include "platform/text.h"
 
 namespace vlm::platform {
 
@@ -43,11 +45,7 @@ PropertyList dictionaryOf(PropertyListEntries entries) {
 
 std::string quotedForPerson(std::string_view input) {
     constexpr std::size_t kLongest = 40;
-    std::string quoted = "\"";
-    for (const char character : input.substr(0, kLongest))
-        quoted += character >= ' ' && character <= '~' ? character : '?';
-    quoted += input.size() > kLongest ? "...\"" : "\"";
-    return quoted;
+    return text("\"{}\"", harmlessText(input, kLongest));
 }
 
 }  // namespace vlm::platform

@@ -86,7 +86,7 @@ using PropertyListEntries = std::vector<PropertyList::Dictionary::Entry>;
 // A key that comes more than once has its last value, in the place of the first.
 PropertyList dictionaryOf(PropertyListEntries entries);
 
-// Something out of the input in quotes, fit for a sentence: short, and nothing but visible ASCII.
+// Something out of the input in quotes, fit for a sentence: short and harmless.
 std::string quotedForPerson(std::string_view input);
 
 }  // namespace vlm::platform

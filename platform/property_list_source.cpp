@@ -89,6 +89,7 @@ void PropertyListSource::cutWhereItIsNoText() {
 
 PropertyListSource::Place PropertyListSource::placeOf(std::size_t offset) const {
     const std::string_view whole = text();
+    offset = std::min(offset, whole.size());
     Place place;
     std::size_t lineStart = 0;
     for (std::size_t at = 0; at < offset; ++at) {

@@ -1,17 +1,29 @@
 #include "platform/seen_set.h"
 
 #include <bit>
+#include <chrono>
+#include <exception>
 #include <random>
 
 namespace vlm::platform {
 
-const SeenSet::Secret& SeenSet::secretOfThisProcess() {
-    static const Secret secret = [] {
+SeenSet::Secret SeenSet::makeSecret() {
+    Secret secret{};
+    try {
         std::random_device random;
-        Secret made{};
-        for (auto& part : made) part = (std::uint64_t{random()} << 32U | random()) | 1U;
-        return made;
-    }();
+        for (auto& part : secret) part = (std::uint64_t{random()} << 32U | random()) | 1U;
+    } catch (const std::exception&) {
+        // Without a source of randomness, what differs from one process to the next has to do.
+        const auto place = reinterpret_cast<std::uintptr_t>(&secret);
+        const auto now = std::chrono::steady_clock::now().time_since_epoch().count();
+        std::mt19937_64 numbers(place ^ static_cast<std::uint64_t>(now));
+        for (auto& part : secret) part = numbers() | 1U;
+    }
+    return secret;
+}
+
+const SeenSet::Secret& SeenSet::secretOfThisProcess() {
+    static const Secret secret = makeSecret();
     return secret;
 }
 

@@ -4,7 +4,7 @@
 // Pieces are told apart by a hash with a secret of this process in it, so that whoever makes the
 // input cannot choose pieces that all meet in one place.
 //
-// Threads: a value. Errors: numbers go up to kMostPieces.
+// Threads: a value. Errors: none; numbers are at most kMostPieces.
 
 #pragma once
 
@@ -93,6 +93,7 @@ private:
     void grow();
 
     using Secret = std::array<std::uint64_t, 3>;
+    static Secret makeSecret();
     static const Secret& secretOfThisProcess();
 
     Secret _secret;

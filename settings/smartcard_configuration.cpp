@@ -53,10 +53,9 @@ std::optional<PropertyList::Dictionary> readSmartCardConfiguration(std::istream&
         return std::nullopt;
     }
 
-    std::string content(static_cast<std::size_t>(size), '\0');
-    stream.read(content.data(), size);
-    const auto list =
-        platform::readPropertyList(Bytes(content.begin(), content.end()), kConfigurationLimits);
+    Bytes content(static_cast<std::size_t>(size));
+    stream.read(reinterpret_cast<char*>(content.data()), size);
+    const auto list = platform::readPropertyList(content, kConfigurationLimits);
     if (!list || !list->dictionary()) return std::nullopt;
     return *list->dictionary();
 }

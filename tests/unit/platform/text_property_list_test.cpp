@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "binary_list.h"
+#include "examined.h"
 #include "platform/property_list.h"
 
 namespace vlm::platform {
@@ -11,9 +12,7 @@ namespace {
 using Array = PropertyList::Array;
 using Dictionary = PropertyList::Dictionary;
 
-PropertyListExamination examine(std::string_view text, const PropertyListLimits& limits = {}) {
-    return examinePropertyList(Bytes(text.begin(), text.end()), limits);
-}
+using test::examine;
 
 TEST(TextPropertyListTest, ReadsWhatPeopleWrite) {
     struct {
@@ -64,11 +63,7 @@ TEST(TextPropertyListTest, ReadsWhatPeopleWrite) {
         {"a mark of UTF-8", "\xEF\xBB\xBF( a )", Array{"a"}},
     };
     for (const auto& row : rows) {
-        const auto found = examine(row.text);
-        EXPECT_EQ(found.value, row.value) << row.why << ": " << found.problem;
-        EXPECT_EQ(found.format, PropertyListFormat::Text) << row.why;
-        EXPECT_EQ(found.problem, "") << row.why;
-        EXPECT_EQ(found.line, 0u) << row.why;
+        test::expectValue(examine(row.text), PropertyListFormat::Text, row.value, row.why);
     }
 }
 
@@ -143,12 +138,7 @@ TEST(TextPropertyListTest, TellsWhatIsWrongAndWhere) {
          "The character with the code 27 is no part of a text.", 1, 4},
     };
     for (const auto& row : rows) {
-        const auto found = examine(row.text);
-        EXPECT_FALSE(found.value) << row.why;
-        EXPECT_EQ(found.format, PropertyListFormat::Text) << row.why;
-        EXPECT_EQ(found.problem, row.problem) << row.why;
-        EXPECT_EQ(found.line, row.line) << row.why;
-        EXPECT_EQ(found.column, row.column) << row.why;
+        test::expectProblem(examine(row.text), PropertyListFormat::Text, row);
     }
 }
 

@@ -2,18 +2,14 @@
 
 #include <gtest/gtest.h>
 
+#include "examined.h"
 #include "platform/property_list.h"
 
 namespace vlm::platform {
 namespace {
 
-PropertyListExamination examine(std::string_view text) {
-    return examinePropertyList(Bytes(text.begin(), text.end()));
-}
-
-PropertyListExamination examineValue(std::string_view element) {
-    return examine("<plist>" + std::string(element) + "</plist>");
-}
+using test::examine;
+using test::examineXmlValue;
 
 TEST(XmlPropertyListProblemsTest, ExpandsNoEntityOfADocument) {
     struct {
@@ -89,7 +85,7 @@ TEST(XmlPropertyListProblemsTest, RefusesScalarsThatAreNone) {
         {"a character that is not ASCII", "<data>AQI\xC3\xA9</data>"},
     };
     for (const auto& row : rows) {
-        const auto found = examineValue(row.element);
+        const auto found = examineXmlValue(row.element);
         EXPECT_FALSE(found.value) << row.why;
         EXPECT_TRUE(found.problem.starts_with("This is no ") ||
                     found.problem.ends_with("holds no text."))
@@ -133,7 +129,7 @@ TEST(XmlPropertyListProblemsTest, TellsWhatIsWrongAndWhere) {
         {"letters count", "<plist><Dict/></plist>", "No value is written as the element \"Dict\".",
          1, 8},
         {"an unknown element with a name for terminals", "<plist><\xE2\x80\xAE/></plist>",
-         "No value is written as the element \"???\".", 1, 8},
+         "No value is written as the element \"\uFFFD\".", 1, 8},
         {"an unknown element with a long name",
          "<plist><aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaa/></plist>",
          "No value is written as the element \"aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaa...\".", 1,
@@ -197,12 +193,7 @@ TEST(XmlPropertyListProblemsTest, TellsWhatIsWrongAndWhere) {
          "The character with the code 65535 is no part of a text.", 1, 16},
     };
     for (const auto& row : rows) {
-        const auto found = examine(row.text);
-        EXPECT_FALSE(found.value) << row.why;
-        EXPECT_EQ(found.format, PropertyListFormat::Xml) << row.why;
-        EXPECT_EQ(found.problem, row.problem) << row.why;
-        EXPECT_EQ(found.line, row.line) << row.why;
-        EXPECT_EQ(found.column, row.column) << row.why;
+        test::expectProblem(examine(row.text), PropertyListFormat::Xml, row);
     }
 }
 

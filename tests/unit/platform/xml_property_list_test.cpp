@@ -8,6 +8,7 @@
 #include <limits>
 
 #include "binary_list.h"
+#include "examined.h"
 #include "platform/property_list.h"
 
 namespace vlm::platform {
@@ -19,13 +20,8 @@ using Dictionary = PropertyList::Dictionary;
 
 constexpr double kInfinity = std::numeric_limits<double>::infinity();
 
-PropertyListExamination examine(std::string_view text, const PropertyListLimits& limits = {}) {
-    return examinePropertyList(Bytes(text.begin(), text.end()), limits);
-}
-
-PropertyListExamination examineValue(std::string_view element) {
-    return examine("<plist>" + std::string(element) + "</plist>");
-}
+using test::examine;
+using test::examineXmlValue;
 
 TEST(XmlPropertyListTest, ReadsEveryKindOfValue) {
     struct {
@@ -93,17 +89,14 @@ TEST(XmlPropertyListTest, ReadsEveryKindOfValue) {
          Dictionary{{"a", 3}, {"b", 2}}},
     };
     for (const auto& row : rows) {
-        const auto found = examineValue(row.element);
-        EXPECT_EQ(found.value, row.value) << row.why << ": " << found.problem;
-        EXPECT_EQ(found.format, PropertyListFormat::Xml) << row.why;
-        EXPECT_EQ(found.problem, "") << row.why;
-        EXPECT_EQ(found.line, 0u) << row.why;
+        test::expectValue(examineXmlValue(row.element), PropertyListFormat::Xml, row.value,
+                          row.why);
     }
 }
 
 TEST(XmlPropertyListTest, ReadsWhatIsNoNumber) {
     for (const char* element : {"<real>nan</real>", "<real>NaN</real>"})
-        EXPECT_TRUE(std::isnan(examineValue(element).value.value().real().value())) << element;
+        EXPECT_TRUE(std::isnan(examineXmlValue(element).value.value().real().value())) << element;
 }
 
 TEST(XmlPropertyListTest, ReadsRealsWhereADecimalPointIsAComma) {
@@ -113,8 +106,8 @@ TEST(XmlPropertyListTest, ReadsRealsWhereADecimalPointIsAComma) {
     if (std::localeconv()->decimal_point != std::string_view(","))
         GTEST_SKIP() << "no locale with a decimal comma is installed";
 
-    const auto withPoint = examineValue("<real>1.5</real>").value;
-    const auto withComma = examineValue("<real>1,5</real>").value;
+    const auto withPoint = examineXmlValue("<real>1.5</real>").value;
+    const auto withComma = examineXmlValue("<real>1,5</real>").value;
     std::setlocale(LC_ALL, before.c_str());
 
     EXPECT_EQ(withPoint, PropertyList(1.5));
