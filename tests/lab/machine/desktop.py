@@ -1,0 +1,111 @@
+"""What people do at the machine: run commands, insert cards, answer questions, look at the screen."""
+
+import json
+import subprocess
+import time
+from dataclasses import dataclass
+
+from machine.container import Container, LabError
+
+PATIENCE_SECONDS = 20
+ANSWERS = "/run/vlm-lab"
+
+
+@dataclass(frozen=True)
+class Done:
+    """A command that ended."""
+
+    command: str
+    status: int
+    output: str
+    errors: str
+
+    def __str__(self) -> str:
+        return f"{self.command}\nended with {self.status}\n{self.output}{self.errors}"
+
+
+class Desktop:
+    def __init__(self, container: Container) -> None:
+        self.container = container
+
+    def root(self, *command: str, typed: str = "") -> Done:
+        return self._done(self.command_for(None, list(command)), command, typed)
+
+    def user(self, name: str, *command: str, typed: str = "") -> Done:
+        """On the desktop of a user who is logged in; else as one who came in from afar."""
+        return self._done(self.command_for(name, list(command)), command, typed)
+
+    def command_for(self, user: str | None, command: list[str], terminal: bool = False) -> list[str]:
+        # A service has the mounts, the groups and the clean environment of the machine.
+        start = ["systemd-run", "--quiet", "--wait", "--collect", "--pty" if terminal else "--pipe"]
+        if user is None:
+            start.append("--setenv=HOME=/root")
+        elif self._has_desktop(user):
+            start += ["--user", f"--machine={user}@"]
+        else:
+            start += [f"--property=User={user}", "--property=PAMName=login"]
+        return self.container.command([*start, "--", *command])
+
+    def insert(self, card: str, reader: int = 1) -> None:
+        self._inside("card-ctl", "insert", card, str(reader))
+
+    def remove(self, reader: int = 1) -> None:
+        self._inside("card-ctl", "remove", str(reader))
+
+    def card_ctl(self, *words: str) -> str:
+        return self._inside("card-ctl", *words)
+
+    def answer(self, who: str, words: str) -> None:
+        """What polkit's agent or the pinentry shall do when asked; image/files has the words."""
+        self._inside("sh", "-c", f"printf '%s' \"$1\" >{ANSWERS}/{who}", "answer", words)
+
+    def asked(self, who: str) -> list[dict]:
+        """The questions so far."""
+        lines = self._inside("cat", f"{ANSWERS}/{who}.asked").splitlines()
+        return [json.loads(line) for line in lines]
+
+    def journal(self, *options: str) -> str:
+        return self._inside("journalctl", "--no-pager", "--output=cat", *options)
+
+    def screenshot(self) -> bytes:
+        """A PNG of the console's screen."""
+        take = 'exec 2>&1; scrot --overwrite "$XDG_RUNTIME_DIR/shot.png"'
+        user = self._user_at_console()
+        taken = self.user(user, "sh", "-c", take)
+        if taken.status != 0:
+            raise LabError(f"no screenshot: {taken.output}")
+        image = f"/run/user/$(id -u {user})/shot.png"
+        return self.container.run(["sh", "-c", f"cat {image}; rm {image}"], capture_output=True).stdout
+
+    def wait_until(self, what: str, reached, seconds: float = PATIENCE_SECONDS):
+        """The first answer of reached() that counts as true."""
+        end = time.monotonic() + seconds
+        while not (answer := reached()):
+            if time.monotonic() > end:
+                raise AssertionError(f"waited {seconds} s in vain for this: {what}")
+            time.sleep(0.05)
+        return answer
+
+    def _user_at_console(self) -> str:
+        active = self._inside("loginctl", "show-seat", "seat0", "--property=ActiveSession", "--value")
+        if not active.strip():
+            raise LabError("nobody is at the console")
+        show = ["loginctl", "show-session", active.strip(), "--property=Name", "--value"]
+        return self._inside(*show).strip()
+
+    def _has_desktop(self, user: str) -> bool:
+        sessions = self._inside("loginctl", "list-sessions", "--no-legend").splitlines()
+        return any(line.split()[2:4] == [user, "seat0"] for line in sessions)
+
+    def _inside(self, *command: str) -> str:
+        """For what the lab itself needs done."""
+        done = self.container.run(list(command), capture_output=True, text=True)
+        if done.returncode != 0:
+            raise LabError(f"{' '.join(command)}: {(done.stderr or done.stdout).strip()}")
+        return done.stdout
+
+    def _done(self, whole: list[str], command: tuple[str, ...], typed: str) -> Done:
+        done = subprocess.run(
+            whole, input=typed, capture_output=True, text=True, timeout=3 * PATIENCE_SECONDS
+        )
+        return Done(" ".join(command), done.returncode, done.stdout, done.stderr)
