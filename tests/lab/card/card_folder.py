@@ -7,6 +7,7 @@ from uuid import UUID
 
 from cryptography import x509
 from cryptography.hazmat.primitives import serialization
+from cryptography.hazmat.primitives.asymmetric import ec, rsa
 
 import piv_objects
 from card_state import CardState
@@ -38,11 +39,8 @@ def save(
 ) -> None:
     folder.mkdir()
     for slot, (key, certificate) in identities.items():
-        _key_file(folder, slot).write_bytes(
-            key.private_bytes(
-                _PEM, serialization.PrivateFormat.PKCS8, serialization.NoEncryption()
-            )
-        )
+        _key_file(folder, slot).touch(mode=0o600)
+        _key_file(folder, slot).write_bytes(_key_text(key))
         certificate_file(folder, slot).write_bytes(certificate.public_bytes(_PEM))
     description = {
         "guid": str(guid),
@@ -83,7 +81,12 @@ def _description_file(folder: Path) -> Path:
     return folder / "card.json"
 
 
+def _key_text(key: PrivateKey) -> bytes:
+    no_password = serialization.NoEncryption()
+    return key.private_bytes(_PEM, serialization.PrivateFormat.PKCS8, no_password)
+
+
 def _load_key(path: Path) -> PrivateKey:
     key = serialization.load_pem_private_key(path.read_bytes(), password=None)
-    assert isinstance(key, PrivateKey)
+    assert isinstance(key, (rsa.RSAPrivateKey, ec.EllipticCurvePrivateKey))
     return key

@@ -82,10 +82,7 @@ class PivCard:
 
     def _fit(self, data: bytes, expected: int) -> bytes:
         self._rest = data[expected:]
-        status = Status.OK
-        if self._rest:
-            status = Status.MORE_DATA | (len(self._rest) if len(self._rest) < 256 else 0)
-        return data[:expected] + status.to_bytes(2, "big")
+        return data[:expected] + _status_before(self._rest).to_bytes(2, "big")
 
     def _run(self, command: Command) -> bytes:
         if command.ins == 0xA4:
@@ -185,6 +182,12 @@ class PivCard:
             self._verified_for_one_use = False
         if not allowed:
             raise CommandRefused(Status.NOT_VERIFIED)
+
+
+def _status_before(rest: bytes) -> int:
+    if not rest:
+        return Status.OK
+    return Status.MORE_DATA | (len(rest) if len(rest) < 256 else 0)
 
 
 def _require_parameters(command: Command, *known: int) -> None:
