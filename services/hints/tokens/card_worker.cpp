@@ -50,13 +50,13 @@ void CardWorker::prove(ProofRequest request, std::function<void(Proof)> answer) 
     enqueue(std::move(job));
 }
 
-std::chrono::milliseconds CardWorker::limitOf(const Job& job) const {
+std::chrono::milliseconds CardWorker::patienceFor(const Job& job) const {
     return job.proof ? _limits.prove : _limits.list;
 }
 
 void CardWorker::enqueue(Job job) {
     const auto place = _waiting.insert(_waiting.end(), std::move(job));
-    place->limit = callAfter(_event, limitOf(*place), [this, place] { waitedTooLong(place); });
+    place->limit = callAfter(_event, patienceFor(*place), [this, place] { waitedTooLong(place); });
     scheduleStart();
 }
 
@@ -75,12 +75,24 @@ void CardWorker::startNext() {
                             {},
                             PinState::Ready,
                             "the PIN or the challenge is longer than any card takes"});
-    // Time spent in the queue is not held against the worker.
-    _current->limit = callAfter(_event, limitOf(*_current),
-                                [this] { fail("did not answer in time and was ended"); });
+    limitCurrent();
     if (!ensureProcess()) return fail("has no process to run in");
     if (!send(*_current))
         fail(hasHungUp(_process->socket.get()) ? kEnded : "does not take requests");
+}
+
+// Time spent in the queue is not held against the worker.
+void CardWorker::limitCurrent() {
+    const auto end = [this] { fail("did not answer in time and was ended"); };
+    const auto most = _current->proof ? _limits.prove : _limits.read;
+    if (_current->proof || most <= _limits.list) {
+        _current->limit = callAfter(_event, most, end);
+        return;
+    }
+    _current->limit = callAfter(_event, _limits.list, [this, end, rest = most - _limits.list] {
+        _current->limit = callAfter(_event, rest, end);
+        std::exchange(_current->listed, nullptr)(_tokens);
+    });
 }
 
 bool CardWorker::send(Job& job) {
@@ -149,7 +161,7 @@ void CardWorker::finishList(ListAnswer answer) {
 
     const auto listed = std::move(_current->listed);
     goIdle();
-    listed(_tokens);
+    if (listed) listed(_tokens);
 }
 
 void CardWorker::finishProof(Proof proof) {
@@ -189,7 +201,10 @@ void CardWorker::fail(const std::string& why) {
     const Job job = std::move(*_current);
     _current.reset();
     scheduleStart();
-    if (!job.proof) return job.listed({});
+    if (!job.proof) {
+        if (job.listed) job.listed({});
+        return;
+    }
     job.proved({Proof::Outcome::CardFailed,
                 {},
                 PinState::Ready,

@@ -1,11 +1,12 @@
 // CardWorker: one card module, in a worker process of its own that is started when it is needed.
 //
 // The worker serves one request at a time; others wait. A worker that ends, breaks its word or
-// takes longer than a request's limit is ended, fails that request, and is started anew for the
-// next one. Without a request for a while it is ended as well, so that its memory comes back.
+// takes longer than the limit of a reading or a proof is ended, fails what it was asked for, and is
+// started anew for the next request. Without a request for a while it is ended as well, so that its memory comes back.
 //
-// A listing that waits behind a proof (which may wait for a person at a PIN pad) for longer than
-// its own limit is answered with the tokens that the module had last.
+// A listing that takes longer than its askers wait, because a card is slow to read or because a proof
+// (which may wait for a person at a PIN pad) is before it, is answered with the tokens that the
+// module had last. The reading goes on, and the next listing has what it found.
 //
 // Threads: the event loop's. Answers come from the loop, exactly once each, never before the
 // asking call has returned; at the end of the worker's life those that are missing do not come.
@@ -29,7 +30,8 @@
 namespace vlm::service {
 
 struct WorkerLimits {
-    std::chrono::milliseconds list{5'000};
+    std::chrono::milliseconds list{5'000};   // how long an asker waits
+    std::chrono::milliseconds read{60'000};  // how long the worker may take for a listing
     std::chrono::milliseconds prove{60'000};
     std::chrono::milliseconds idle{60'000};
 };
@@ -55,12 +57,12 @@ public:
 private:
     struct Job {
         std::optional<ProofRequest> proof;  // none: a listing
-        std::function<void(const Tokens&)> listed;
+        std::function<void(const Tokens&)> listed;  // empty once the asker waits no longer
         std::function<void(Proof)> proved;
         EventSource limit;
     };
 
-    std::chrono::milliseconds limitOf(const Job& job) const;
+    std::chrono::milliseconds patienceFor(const Job& job) const;
     void enqueue(Job job);
     void startNext();
     bool send(Job& job);
@@ -69,6 +71,7 @@ private:
     void receiveAnswer(const Bytes& message);
     void finishList(ListAnswer answer);
     void finishProof(Proof proof);
+    void limitCurrent();
     void waitedTooLong(std::list<Job>::iterator job);
     void fail(const std::string& why);
     void report(const std::string& line);

@@ -17,6 +17,7 @@ from machine import image
 STATES = Path("/run/vlm-lab")
 BOOT_SECONDS = 60
 DOWN_SECONDS = 10
+PATH = "/usr/local/sbin:/usr/local/bin:/usr/sbin:/usr/bin:/sbin:/bin"
 
 
 class LabError(Exception):
@@ -58,7 +59,7 @@ class Container:
         leader = self._leader()
         if leader is None:
             raise LabError(f"the machine {self.name} is not up")
-        inside = ["env", "-i", "PATH=/usr/sbin:/usr/bin:/sbin:/bin", "LANG=C.UTF-8", "HOME=/root"]
+        inside = ["env", "-i", f"PATH={PATH}", "LANG=C.UTF-8", "HOME=/root"]
         return ["nsenter", "--target", str(leader), "--all", "--", *inside, *arguments]
 
     def run(self, arguments: list[str], **how) -> subprocess.CompletedProcess:
@@ -114,11 +115,13 @@ class Container:
 
 
 def install(build: Path, target: Path) -> None:
-    """What an administrator does with a build, into a folder."""
+    """What an administrator does with a build, into a folder; and the programs of the scenarios."""
     if not (build / "CMakeCache.txt").exists():
         raise LabError(f"there is no build in {build}; build first")
+    into_usr = ["cmake", "--install", str(build), "--prefix", "/usr", "--strip"]
     commands = [
-        ["cmake", "--install", str(build), "--prefix", "/usr", "--strip"],
+        into_usr,
+        [*into_usr, "--component", "lab"],
         ["systemctl", "--quiet", "--global", f"--root={target}", "enable", "vlmhintsd.service"],
     ]
     for command in commands:

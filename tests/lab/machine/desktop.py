@@ -1,6 +1,9 @@
 """What people do at the machine: run commands, insert cards, answer questions, look at the screen."""
 
 import json
+import os
+import pty
+import shlex
 import subprocess
 import time
 from dataclasses import dataclass
@@ -35,16 +38,31 @@ class Desktop:
         """On the desktop of a user who is logged in; else as one who came in from afar."""
         return self._done(self.command_for(name, list(command)), command, typed)
 
+    def on_terminal(self, name: str | None, command: list[str], typing: dict[str, str]) -> Done:
+        """On a terminal where somebody types: when the first text is shown, what belongs to it, then
+        when the next is."""
+        whole = self.command_for(name, command, terminal=True)
+        ours, theirs = pty.openpty()
+        process = subprocess.Popen(whole, stdin=theirs, stdout=theirs, stderr=theirs)
+        os.close(theirs)
+        shown = ""
+        waiting = list(typing.items())
+        while more := _read_terminal(ours):
+            shown += more
+            if waiting and waiting[0][0] in shown:
+                os.write(ours, waiting.pop(0)[1].encode())
+        os.close(ours)
+        status = process.wait(3 * PATIENCE_SECONDS)
+        return Done(" ".join(command), status, shown.replace("\r\n", "\n"), "")
+
     def command_for(self, user: str | None, command: list[str], terminal: bool = False) -> list[str]:
+        if user and not self._has_desktop(user):
+            afar = ["ssh", "-q", "-tt" if terminal else "-T", f"{user}@localhost"]
+            return self.container.command([*afar, "--", shlex.join(command)])
         # A service has the mounts, the groups and the clean environment of the machine.
         start = ["systemd-run", "--quiet", "--wait", "--collect", "--pty" if terminal else "--pipe"]
-        if user is None:
-            start.append("--setenv=HOME=/root")
-        elif self._has_desktop(user):
-            start += ["--user", f"--machine={user}@"]
-        else:
-            start += [f"--property=User={user}", "--property=PAMName=login"]
-        return self.container.command([*start, "--", *command])
+        whose = ["--user", f"--machine={user}@"] if user else ["--setenv=HOME=/root"]
+        return self.container.command([*start, *whose, "--", *command])
 
     def insert(self, card: str, reader: int = 1) -> None:
         self._inside("card-ctl", "insert", card, str(reader))
@@ -109,3 +127,11 @@ class Desktop:
             whole, input=typed, capture_output=True, text=True, timeout=3 * PATIENCE_SECONDS
         )
         return Done(" ".join(command), done.returncode, done.stdout, done.stderr)
+
+
+def _read_terminal(descriptor: int) -> str:
+    """What was shown since; nothing at the end, which Linux tells by an error."""
+    try:
+        return os.read(descriptor, 65536).decode(errors="replace")
+    except OSError:
+        return ""

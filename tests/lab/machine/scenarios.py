@@ -37,9 +37,6 @@ def run_scenarios(names: list[str], build: Path) -> int:
 
 
 def _scenarios_of(file: Path) -> dict:
-    # Scenario files use what stands beside them.
-    if str(FOLDER) not in sys.path:
-        sys.path.insert(0, str(FOLDER))
     spec = importlib.util.spec_from_file_location(f"scenarios.{file.stem}", file)
     module = importlib.util.module_from_spec(spec)
     spec.loader.exec_module(module)

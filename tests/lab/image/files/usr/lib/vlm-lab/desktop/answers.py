@@ -9,6 +9,7 @@ from pathlib import Path
 
 FOLDER = Path("/run/vlm-lab")
 UNTOLD = "dismiss"
+LOOKS_AGAIN_SECONDS = 0.05
 
 
 def answer_of(who: str) -> tuple[str, str]:

@@ -1,0 +1,107 @@
+"""The hints service: started when asked, gone when nobody asks, none the worse for a bad end."""
+
+import subprocess
+
+from machine.checks import check
+from machine.listing import identities, only_identity, pair
+
+SERVICE = "vlmhintsd.service"
+
+
+def nothing_starts_it_but_a_request(lab):
+    check.assertFalse(_runs(lab), lab.journal("-u", SERVICE))
+
+    check.assertEqual(lab.root("vlmbind", "-i").status, 0)
+
+    check.assertTrue(_runs(lab))
+
+
+def it_leaves_when_idle_and_comes_back_with_its_pairings(lab):
+    _leave_soon(lab)
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "pin 123456")
+    check.assertEqual(pair(lab, "alice", hash_).status, 0)
+
+    lab.wait_until("it left", lambda: not _runs(lab))
+    left = lab.root("systemctl", "show", SERVICE, "--property=Result", "--value")
+    check.assertEqual(left.output, "success\n")
+
+    check.assertIn(f"{hash_}\talice - Alice Archer\n", lab.root("vlmbind", "-i").output)
+
+
+def a_pin_is_asked_for_by_a_service_that_was_just_started(lab):
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "pin 123456")
+    lab.root("systemctl", "stop", SERVICE)
+
+    paired = pair(lab, "alice", hash_)
+
+    check.assertEqual(paired.status, 0, paired)
+    check.assertEqual(len(lab.asked("pinentry")), 1)
+
+
+def a_restart_forgets_nothing(lab):
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "pin 123456")
+    check.assertEqual(pair(lab, "alice", hash_).status, 0)
+
+    lab.root("systemctl", "restart", SERVICE)
+
+    check.assertIn(f"{hash_}\talice - Alice Archer\n", lab.root("vlmbind", "-i").output)
+
+
+def killed_in_the_middle_of_a_pairing_it_has_written_nothing(lab):
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "wait")
+    command = lab.command_for(None, ["vlmbind", "-p", "-u", "alice", "-h", hash_])
+    pairing = subprocess.Popen(command, stdout=subprocess.PIPE, text=True)
+    lab.wait_until("the PIN is asked for", lambda: lab.asked("pinentry"))
+
+    lab.root("systemctl", "kill", "--signal=KILL", SERVICE)
+
+    output, _ = pairing.communicate(timeout=30)
+    check.assertEqual(pairing.returncode, 255, output)
+    check.assertIn(f"Cannot pair user (public key hash: {hash_}).", output)
+    lab.answer("pinentry", "pin 123456")
+    check.assertNotIn(hash_, lab.root("vlmctl", "pairings").output)
+    check.assertEqual(pair(lab, "alice", hash_).status, 0)
+
+
+def a_module_that_crashes_takes_no_service_with_it(lab):
+    lab.insert("rsa")
+    only_identity(lab, "Alice Archer")
+    service = _main_pid(lab)
+
+    lab.root("pkill", "--signal", "SEGV", "vlm-token-worke")
+
+    check.assertEqual(list(identities(lab)), ["Alice Archer"])
+    check.assertEqual(_main_pid(lab), service)
+
+
+def its_database_is_roots_alone(lab):
+    lab.insert("rsa")
+    lab.answer("pinentry", "pin 123456")
+    pair(lab, "alice", only_identity(lab, "Alice Archer"))
+
+    database = "/var/lib/vlm/hints.sqlite3"
+    check.assertEqual(lab.root("stat", "-c", "%U %a", database).output, "root 600\n")
+    check.assertNotEqual(lab.user("alice", "cat", database).status, 0)
+
+
+def _runs(lab) -> bool:
+    return lab.root("systemctl", "is-active", "--quiet", SERVICE).status == 0
+
+
+def _main_pid(lab) -> str:
+    return lab.root("systemctl", "show", SERVICE, "--property=MainPID", "--value").output
+
+
+def _leave_soon(lab) -> None:
+    lines = r"[Service]\nExecStart=\nExecStart=/usr/libexec/vlm/vlmhintsd --system --idle-seconds 1\n"
+    folder = f"/run/systemd/system/{SERVICE}.d"
+    lab.root("sh", "-c", f"mkdir -p {folder} && printf '{lines}' >{folder}/soon.conf")
+    lab.root("systemctl", "daemon-reload")
