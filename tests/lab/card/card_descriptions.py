@@ -52,7 +52,9 @@ def _card(name: str, description: Any) -> CardDescription:
         for slot, other in fields.take("other_holders", dict, {}).items()
     }
     keys = fields.take("keys", dict)
-    if not keys or not others.keys() <= keys.keys():
+    if not keys:
+        raise DescriptionError(f"{name}: there are no keys")
+    if not others.keys() <= keys.keys():
         raise DescriptionError(f"{name}: there is a holder without a key")
     card = CardDescription(
         name=name,

@@ -23,7 +23,7 @@ class Refusal(Exception):
 class Times:
     """In seconds."""
 
-    # How long vpcd may take to listen, for it may have just begun; and again to take the card.
+    # How long vpcd may take to listen, for it may have just begun; to take a card; to let it go.
     patience: float = 5.0
     # pcscd looks into a reader every 0.4 s. Had a card come back sooner after it failed a command,
     # it would never have been gone for pcscd, and nobody would hear of the removal.

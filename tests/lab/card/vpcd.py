@@ -12,8 +12,6 @@ from card_folder import VirtualCard
 
 _POWER_OFF, _POWER_ON, _RESET, _SEND_ATR = b"\0", b"\1", b"\2", b"\4"
 
-_NOTICED_AFTER = 5  # seconds at most, until vpcd sees that a card is gone
-
 
 class CardDied(Exception):
     """The card leaves in the middle of a command."""
@@ -33,7 +31,8 @@ class Insertion:
 
     async def serve(self, accepted: "asyncio.Future[None]", patience: float) -> None:
         """Ends when vpcd hangs up, with CardDied, cancelled, or with TimeoutError when vpcd has
-        not taken the card after so many seconds of patience; accepted is set when it has."""
+        not taken the card after so many seconds of patience; accepted is set when it has. In the
+        end vpcd knows that the card is gone, unless that takes it as long again."""
         try:
             # The connection alone stands before vpcd knows of it. Its first message tells.
             async with asyncio.timeout(patience):
@@ -45,13 +44,13 @@ class Insertion:
         except (asyncio.IncompleteReadError, ConnectionError):
             pass
         finally:
-            await self._hang_up()
+            await self._hang_up(patience)
 
-    async def _hang_up(self) -> None:
+    async def _hang_up(self, patience: float) -> None:
         # vpcd looks at its card now and then; when it hangs up as well, it has noticed.
         try:
             self._outgoing.write_eof()
-            async with asyncio.timeout(_NOTICED_AFTER):
+            async with asyncio.timeout(patience):
                 while await self._incoming.read(1000):
                     pass
         except (OSError, TimeoutError):
