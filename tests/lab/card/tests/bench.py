@@ -3,14 +3,12 @@
 import atexit
 import json
 import shutil
-import sys
 import tempfile
 from functools import cache
 from pathlib import Path
+from typing import Any
 
 from cryptography import x509
-
-sys.path.insert(0, str(Path(__file__).parents[1]))
 
 import card_folder
 import make_cards
@@ -22,7 +20,7 @@ PUK, WRONG_PUK, OTHER_PUK = b"12345678", b"00000000", b"87654321"
 
 SELECT = bytes.fromhex("00a4040009a00000030800001000")
 
-_DESCRIPTIONS = {
+_DESCRIPTIONS: dict[str, dict[str, Any]] = {
     "rsa": {"keys": {"9a": "rsa-2048", "9d": "rsa-2048"}},
     "ec": {"keys": {"9a": "p-256", "9c": "p-256", "9d": "p-256", "9e": "p-256"}},
     "slow": {"keys": {"9a": "p-256"}, "delay_seconds": 60},
@@ -32,7 +30,8 @@ _DESCRIPTIONS = {
 
 
 @cache
-def _made_once() -> Path:
+def made_once() -> Path:
+    """All cards, for tests that only look at them."""
     folder = Path(tempfile.mkdtemp(prefix="virtual-cards-"))
     atexit.register(shutil.rmtree, folder)
     holder = {"holder": "Alice Archer", "email": "alice@lab.example"}
@@ -43,13 +42,15 @@ def _made_once() -> Path:
     return folder / "cards"
 
 
-def copy_cards(folder: Path) -> Path:
-    """New cards for one test, which may wear them out."""
-    return Path(shutil.copytree(_made_once(), folder / "cards"))
+def copy_card(name: str, folder: Path) -> Path:
+    """A new card for one test, which may wear it out."""
+    if not (folder / name).exists():
+        shutil.copytree(made_once() / name, folder / name)
+    return folder / name
 
 
-def certificate(cards: Path, card: str, slot: int) -> x509.Certificate:
-    path = card_folder.certificate_file(cards / card, slot)
+def certificate(card: str, slot: int) -> x509.Certificate:
+    path = card_folder.certificate_file(made_once() / card, slot)
     return x509.load_pem_x509_certificate(path.read_bytes())
 
 

@@ -13,11 +13,11 @@ class CardTestCase(unittest.TestCase):
     def setUp(self) -> None:
         folder = tempfile.TemporaryDirectory()
         self.addCleanup(folder.cleanup)
-        self.cards = bench.copy_cards(Path(folder.name))
+        self.cards = Path(folder.name)
 
     def load(self, name: str) -> VirtualCard:
         """The card as it comes out of the drawer, with what its folder remembers."""
-        return card_folder.load(self.cards / name)
+        return card_folder.load(bench.copy_card(name, self.cards))
 
     def talk_selected(self, card: VirtualCard) -> bench.Talk:
         talk = bench.Talk(card)

@@ -35,21 +35,21 @@ class WrongInput(ReadersTestCase):
             "": "usage: '' is none of insert, remove,",
             "eject": "usage: 'eject' is none of insert, remove,",
             "insert": "usage: insert CARD [READER]",
-            "insert rsa 1 2": "usage: insert CARD [READER]",
+            "insert slow 1 2": "usage: insert CARD [READER]",
             "status 1": "usage: status",
-            "set-tries rsa": "usage: set-tries CARD N",
+            "set-tries slow": "usage: set-tries CARD N",
             "insert green": "there is no card 'green' in ",
-            "insert ../cards/rsa": "there is no card '../cards/rsa' in ",
+            "insert ../cards/slow": "there is no card '../cards/slow' in ",
             "insert \x1b[2J": "there is no card '\\x1b[2J' in ",
             "insert ec": "the card in ",
-            "insert rsa 3": "there is no reader '3', only 1 and 2",
-            "insert rsa -1": "there is no reader '-1', only 1 and 2",
+            "insert slow 3": "there is no reader '3', only 1 and 2",
+            "insert slow -1": "there is no reader '-1', only 1 and 2",
             "remove": "reader 1 is empty",
             "remove x": "there is no reader 'x', only 1 and 2",
             "tries green": "there is no card 'green' in ",
-            "set-tries rsa 4": "a PIN cannot have '4' tries left, only 0 to 3",
-            "set-tries rsa -1": "a PIN cannot have '-1' tries left, only 0 to 3",
-            "set-tries rsa many": "a PIN cannot have 'many' tries left, only 0 to 3",
+            "set-tries slow 4": "a PIN cannot have '4' tries left, only 0 to 3",
+            "set-tries slow -1": "a PIN cannot have '-1' tries left, only 0 to 3",
+            "set-tries slow many": "a PIN cannot have 'many' tries left, only 0 to 3",
         }
 
         for line, reason in rows.items():
@@ -67,7 +67,7 @@ class WrongInput(ReadersTestCase):
     async def test_several_commands_go_over_one_connection(self) -> None:
         incoming, outgoing = await asyncio.open_unix_connection(self.socket)
         with contextlib.closing(outgoing):
-            outgoing.write(b"tries rsa\nstatus\n")
+            outgoing.write(b"tries slow\nstatus\n")
 
             self.assertEqual(await incoming.readline(), b"ok pin=3 puk=3\n")
             self.assertEqual(await incoming.readline(), b"ok 1=- 2=-\n")

@@ -15,12 +15,12 @@ PADDED = b"\0\1" + b"\xff" * 202 + b"\0" + _SHA_256 + DIGEST
 
 class Keys(CardTestCase):
     def rsa_key(self, slot: int) -> rsa.RSAPublicKey:
-        key = certificate(self.cards, "rsa", slot).public_key()
+        key = certificate("rsa", slot).public_key()
         assert isinstance(key, rsa.RSAPublicKey)
         return key
 
     def ec_key(self, slot: int) -> ec.EllipticCurvePublicKey:
-        key = certificate(self.cards, "ec", slot).public_key()
+        key = certificate("ec", slot).public_key()
         assert isinstance(key, ec.EllipticCurvePublicKey)
         return key
 

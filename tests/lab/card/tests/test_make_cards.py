@@ -13,7 +13,6 @@ from typing import Any
 import bench
 import card_descriptions
 import make_cards
-from card_test_case import CardTestCase
 from cryptography import x509
 from cryptography.hazmat.primitives.asymmetric import ec
 from cryptography.x509.oid import ExtendedKeyUsageOID, NameOID
@@ -30,22 +29,22 @@ _COMMON_USES = (
 LAB_CARDS = Path(make_cards.__file__).with_name("cards.json")
 
 
-class Certificates(CardTestCase):
+class Certificates(unittest.TestCase):
     def test_they_never_end(self) -> None:
-        certificate = bench.certificate(self.cards, "rsa", 0x9A)
+        certificate = bench.certificate("rsa", 0x9A)
 
         self.assertEqual(certificate.not_valid_before, datetime(2020, 1, 1))
         self.assertEqual(certificate.not_valid_after, datetime(9999, 12, 31, 23, 59, 59))
 
     def test_the_expired_one_has_ended(self) -> None:
-        certificate = bench.certificate(self.cards, "expired", 0x9A)
+        certificate = bench.certificate("expired", 0x9A)
 
         self.assertLess(certificate.not_valid_before, certificate.not_valid_after)
         self.assertLess(certificate.not_valid_after, datetime.now())
 
     def test_they_are_signed_by_the_authority_beside_them(self) -> None:
-        authority = x509.load_pem_x509_certificate((self.cards / "ca.pem").read_bytes())
-        certificate = bench.certificate(self.cards, "rsa", 0x9D)
+        authority = x509.load_pem_x509_certificate((bench.made_once() / "ca.pem").read_bytes())
+        certificate = bench.certificate("rsa", 0x9D)
 
         key = authority.public_key()
         assert isinstance(key, ec.EllipticCurvePublicKey)
@@ -58,7 +57,7 @@ class Certificates(CardTestCase):
         self.assertEqual(certificate.issuer, authority.subject)
 
     def test_they_name_the_holder(self) -> None:
-        certificate = bench.certificate(self.cards, "ec", 0x9A)
+        certificate = bench.certificate("ec", 0x9A)
 
         names = certificate.subject.get_attributes_for_oid(NameOID.COMMON_NAME)
         others = certificate.extensions.get_extension_for_class(x509.SubjectAlternativeName).value
@@ -74,20 +73,20 @@ class Certificates(CardTestCase):
             ("ec", 0x9D, {"key_agreement"}),
         ):
             with self.subTest(card=card, slot=f"{slot:x}"):
-                extensions = bench.certificate(self.cards, card, slot).extensions
+                extensions = bench.certificate(card, slot).extensions
                 usage = extensions.get_extension_for_class(x509.KeyUsage).value
 
                 named = {use for use in _COMMON_USES if getattr(usage, use)}
                 self.assertEqual(named, uses)
 
     def test_the_key_for_log_in_says_so(self) -> None:
-        extensions = bench.certificate(self.cards, "rsa", 0x9A).extensions
+        extensions = bench.certificate("rsa", 0x9A).extensions
 
         usage = extensions.get_extension_for_class(x509.ExtendedKeyUsage).value
         self.assertEqual(list(usage), [ExtendedKeyUsageOID.CLIENT_AUTH])
 
     def test_only_their_owner_reads_the_keys(self) -> None:
-        for key in self.cards.glob("*/*.key.pem"):
+        for key in bench.made_once().glob("*/*.key.pem"):
             self.assertEqual(stat.S_IMODE(key.stat().st_mode), 0o600)
 
 

@@ -82,7 +82,7 @@ class Inserting(ReadersTestCase):
         self.assertEqual(await self.tell("status"), "ok 1=- 2=-")
 
     async def test_remove_is_answered_where_vpcd_hangs(self) -> None:
-        await self.start(patience=1)
+        await self.start(patience=0.5)
         await self.insert("ec")
 
         self.assertEqual(await self.tell("remove"), "ok")
@@ -100,7 +100,7 @@ class Inserting(ReadersTestCase):
     async def test_an_occupied_reader_and_a_card_in_use_are_refused(self) -> None:
         await self.insert("ec")
 
-        self.assertEqual(await self.tell("insert rsa"), "error reader 1 already holds the card ec")
+        self.assertEqual(await self.tell("insert slow"), "error reader 1 already holds the card ec")
         self.assertEqual(await self.tell("insert ec"), "error reader 1 already holds the card ec")
         self.assertEqual(await self.tell("insert ec 2"), "error the card ec is in reader 1 already")
 
