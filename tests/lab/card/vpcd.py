@@ -55,7 +55,8 @@ class Insertion:
                     pass
         except (OSError, TimeoutError):
             pass
-        self._outgoing.close()
+        finally:
+            self._outgoing.close()
 
     async def _receive(self) -> bytes:
         length = int.from_bytes(await self._read(2), "big")
