@@ -9,8 +9,8 @@ build_packages=(
 demo_packages=(dbus opensc openssl p11-kit-modules softhsm2)
 
 test_packages=(
-    gcovr git gnutls-bin libgmock-dev libgtest-dev mandoc p11-kit pinentry-tty procps shellcheck
-    systemd
+    gcovr git gnutls-bin libgmock-dev libgtest-dev mandoc p11-kit pinentry-tty procps
+    python3-cryptography shellcheck systemd
     clang clang-format clang-tidy libclang-rt-14-dev
 )
 

@@ -1,16 +1,15 @@
 """What cards there are to be: the descriptions in cards.json, checked."""
 
 import json
-import re
 from dataclasses import dataclass
 from pathlib import Path
 from typing import Any
 
 import piv_objects
+from card_folder import CARD_NAME
 from certificate_authority import Holder
 
 KEY_KINDS = ("rsa-2048", "p-256")
-CARD_NAME = re.compile(r"[a-z0-9]+(-[a-z0-9]+)*")
 
 
 class DescriptionError(Exception):
@@ -53,7 +52,9 @@ def _card(name: str, description: Any) -> CardDescription:
         for slot, other in fields.take("other_holders", dict, {}).items()
     }
     keys = fields.take("keys", dict)
-    if not keys or not others.keys() <= keys.keys():
+    if not keys:
+        raise DescriptionError(f"{name}: there are no keys")
+    if not others.keys() <= keys.keys():
         raise DescriptionError(f"{name}: there is a holder without a key")
     card = CardDescription(
         name=name,

@@ -1,6 +1,7 @@
 """A card at rest: a folder with its keys, certificates, behaviour and memory."""
 
 import json
+import re
 from dataclasses import dataclass
 from pathlib import Path
 from uuid import UUID
@@ -13,6 +14,8 @@ import piv_objects
 from card_state import CardState
 from piv_card import PivCard
 from private_keys import PrivateKey
+
+CARD_NAME = re.compile(r"[a-z0-9]+(-[a-z0-9]+)*")
 
 _PEM = serialization.Encoding.PEM
 
@@ -88,5 +91,6 @@ def _key_text(key: PrivateKey) -> bytes:
 
 def _load_key(path: Path) -> PrivateKey:
     key = serialization.load_pem_private_key(path.read_bytes(), password=None)
-    assert isinstance(key, (rsa.RSAPrivateKey, ec.EllipticCurvePrivateKey))
-    return key
+    if isinstance(key, (rsa.RSAPrivateKey, ec.EllipticCurvePrivateKey)):
+        return key
+    raise ValueError(f"{path} holds a key of an unknown kind")

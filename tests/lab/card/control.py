@@ -1,7 +1,4 @@
-"""What the virtual readers can be told, one command on a line, each answered by one line.
-
-insert CARD [READER]   remove [READER]   break-next [READER]   status
-tries CARD             set-tries CARD N
+"""What the virtual readers can be told: one command on a line, answered by one line.
 
 The answer begins with "ok", or with "error" and says why. READER is 1 where none is given.
 """
@@ -24,13 +21,13 @@ class Control:
 
     def __init__(self, readers: Readers) -> None:
         self._readers = readers
-        self._commands: dict[str, tuple[Callable[..., Awaitable[str]], int, int]] = {
-            "insert": (self._insert, 1, 2),
-            "remove": (self._remove, 0, 1),
-            "break-next": (self._break_next, 0, 1),
-            "status": (self._status, 0, 0),
-            "tries": (self._tries, 1, 1),
-            "set-tries": (self._set_tries, 2, 2),
+        self._commands: dict[str, tuple[Callable[..., Awaitable[str]], str]] = {
+            "insert": (self._insert, "CARD [READER]"),
+            "remove": (self._remove, "[READER]"),
+            "break-next": (self._break_next, "[READER]"),
+            "status": (self._status, ""),
+            "tries": (self._tries, "CARD"),
+            "set-tries": (self._set_tries, "CARD N"),
         }
 
     async def listen(self, path: Path) -> asyncio.AbstractServer:
@@ -54,7 +51,7 @@ class Control:
                 outgoing.write(answer.encode() + b"\n")
                 await outgoing.drain()
         except ValueError:
-            outgoing.write(b"error that line is too long\n")
+            outgoing.write(b"error usage: this line is too long\n")
         except ConnectionError:
             pass
         finally:
@@ -63,10 +60,11 @@ class Control:
     async def _run(self, words: list[str]) -> str:
         name, *arguments = words or [""]
         if name not in self._commands:
-            raise Refusal(f"there is no command {name!r}, only {', '.join(self._commands)}")
-        command, fewest, most = self._commands[name]
-        if not fewest <= len(arguments) <= most:
-            raise Refusal(f"{name} does not go with {len(arguments)} arguments")
+            raise Refusal(f"usage: {name!r} is none of {', '.join(self._commands)}")
+        command, parameters = self._commands[name]
+        most = len(parameters.split())
+        if not most - parameters.count("[") <= len(arguments) <= most:
+            raise Refusal(f"usage: {name} {parameters}".rstrip())
         return await command(*arguments)
 
     async def _insert(self, card: str, reader: str = "1") -> str:

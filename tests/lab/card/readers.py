@@ -3,34 +3,41 @@
 import asyncio
 import sys
 from collections.abc import Sequence
+from dataclasses import dataclass
 from pathlib import Path
 
-import card_descriptions
 import card_folder
 from card_folder import VirtualCard
 from vpcd import CardDied, Insertion
 
 PORTS = (35963, 35964)  # where vpcd listens, reader 1 first
 
-_VPCD_PATIENCE = 5.0  # seconds in which vpcd must take a card, also when it has just begun
-_RETRY_AFTER = 0.05
-
-# pcscd looks into a reader every 0.4 s. A card that comes back sooner was never gone, for pcscd,
-# and nobody would hear of the removal.
-_EMPTY_AT_LEAST = 0.6
+_RETRY_SECONDS = 0.05
 
 
 class Refusal(Exception):
     """Why something that was asked for cannot be; a text for people."""
 
 
+@dataclass(frozen=True)
+class Times:
+    """In seconds."""
+
+    # How long vpcd may take to listen, for it may have just begun; to take a card; to let it go.
+    patience: float = 5.0
+    # pcscd looks into a reader every 0.4 s. Had a card come back sooner after it failed a command,
+    # it would never have been gone for pcscd, and nobody would hear of the removal.
+    empty_at_least: float = 0.6
+
+
 class Reader:
     """Its card is served by a task of its own, so that no card waits for another."""
 
-    def __init__(self, number: int, port: int) -> None:
+    def __init__(self, number: int, port: int, times: Times) -> None:
         self.number = number
         self.card: VirtualCard | None = None
         self._port = port
+        self._times = times
         self._insertion: Insertion | None = None
         self._service: asyncio.Task[None] | None = None
         self._emptied = float("-inf")  # on the loop's clock
@@ -42,54 +49,49 @@ class Reader:
         self.card = card
         accepted = asyncio.get_running_loop().create_future()
         self._service = asyncio.create_task(self._serve(card, accepted))
-        try:
-            await asyncio.wait_for(accepted, _VPCD_PATIENCE + _EMPTY_AT_LEAST)
-        except asyncio.TimeoutError:
-            await self._empty()
-            raise Refusal(f"vpcd does not take the card in port {self._port}") from None
+        await accepted
 
     async def remove(self) -> None:
-        if not self.card:
+        """Returns when vpcd knows that the card is gone."""
+        if not self._service:
             raise Refusal(f"reader {self.number} is empty")
-        await self._empty()
+        self._service.cancel()
+        await asyncio.wait([self._service])
 
     def break_next(self) -> None:
         if not self._insertion:
             raise Refusal(f"reader {self.number} is empty")
         self._insertion.breaks_at_signature = True
 
-    async def _empty(self) -> None:
-        if self._service:
-            self._service.cancel()
-            await asyncio.wait([self._service])
-
     async def _serve(self, card: VirtualCard, accepted: "asyncio.Future[None]") -> None:
+        failure = Refusal(f"{card.name} left reader {self.number} before vpcd took it")
         try:
             await self._leave_empty_for_long_enough()
             card.chip.reset()
             self._insertion = Insertion(card, *await self._connect())
-            _log(f"{card.name} goes into reader {self.number}")
-            await self._insertion.serve(accepted)
+            await self._insertion.serve(accepted, self._times.patience)
             _log(f"pcscd lets go of {card.name} in reader {self.number}")
         except asyncio.CancelledError:
             _log(f"{card.name} is pulled from reader {self.number}")
         except CardDied:
             _log(f"{card.name} dies in reader {self.number}")
+        except TimeoutError:
+            failure = Refusal(f"vpcd does not take the card {card.name} on port {self._port}")
         except Refusal as refusal:
-            accepted.set_exception(refusal)
+            failure = refusal
         finally:
             self.card = self._insertion = self._service = None
             self._emptied = asyncio.get_running_loop().time()
             if not accepted.done():
-                accepted.set_exception(Refusal(f"{card.name} was out before vpcd had it"))
+                accepted.set_exception(failure)
 
     async def _leave_empty_for_long_enough(self) -> None:
         since = asyncio.get_running_loop().time() - self._emptied
-        await asyncio.sleep(max(0.0, _EMPTY_AT_LEAST - since))
+        await asyncio.sleep(max(0.0, self._times.empty_at_least - since))
 
     async def _connect(self) -> tuple[asyncio.StreamReader, asyncio.StreamWriter]:
         loop = asyncio.get_running_loop()
-        give_up = loop.time() + _VPCD_PATIENCE
+        give_up = loop.time() + self._times.patience
         while True:
             try:
                 return await asyncio.open_connection("127.0.0.1", self._port)
@@ -97,14 +99,14 @@ class Reader:
                 if loop.time() > give_up:
                     text = f"no vpcd listens on port {self._port}, is pcscd running? ({error})"
                     raise Refusal(text) from error
-            await asyncio.sleep(_RETRY_AFTER)
+            await asyncio.sleep(_RETRY_SECONDS)
 
 
 class Readers:
     """All readers, and the folder of the cards that can be put into them."""
 
-    def __init__(self, folder: Path, ports: Sequence[int] = PORTS) -> None:
-        self.readers = [Reader(number, port) for number, port in enumerate(ports, start=1)]
+    def __init__(self, folder: Path, ports: Sequence[int] = PORTS, times: Times = Times()) -> None:
+        self.readers = [Reader(number, port, times) for number, port in enumerate(ports, start=1)]
         self._folder = folder
         self._cards: dict[str, VirtualCard] = {}
 
@@ -112,12 +114,13 @@ class Readers:
         for reader in self.readers:
             if str(reader.number) == number:
                 return reader
-        raise Refusal(f"there is no reader {number!r}, only {self._numbers()}")
+        numbers = " and ".join(str(reader.number) for reader in self.readers)
+        raise Refusal(f"there is no reader {number!r}, only {numbers}")
 
     def card(self, name: str) -> VirtualCard:
         """The one object of this card, which knows its tries."""
         folder = self._folder / name
-        if not card_descriptions.CARD_NAME.fullmatch(name) or not card_folder.is_card(folder):
+        if not card_folder.CARD_NAME.fullmatch(name) or not card_folder.is_card(folder):
             raise Refusal(f"there is no card {name!r} in {self._folder}")
         if name not in self._cards:
             try:
@@ -136,9 +139,6 @@ class Readers:
         for reader in self.readers:
             if reader.card:
                 await reader.remove()
-
-    def _numbers(self) -> str:
-        return " and ".join(str(reader.number) for reader in self.readers)
 
 
 def _log(text: str) -> None:

@@ -14,7 +14,7 @@ _POWER_OFF, _POWER_ON, _RESET, _SEND_ATR = b"\0", b"\1", b"\2", b"\4"
 
 
 class CardDied(Exception):
-    """The connection is to break now, in the middle of a command."""
+    """The card leaves in the middle of a command."""
 
 
 class Insertion:
@@ -29,16 +29,31 @@ class Insertion:
         self._outgoing = outgoing
         self._socket: socket.socket = outgoing.get_extra_info("socket")
 
-    async def serve(self, accepted: "asyncio.Future[None]") -> None:
-        """Ends when vpcd hangs up, with CardDied, or cancelled; accepted is set by vpcd's first
-        message, for the connection alone stands before vpcd knows of it."""
+    async def serve(self, accepted: "asyncio.Future[None]", patience: float) -> None:
+        """Ends when vpcd hangs up, with CardDied, cancelled, or with TimeoutError when vpcd has
+        not taken the card after so many seconds of patience; accepted is set when it has. In the
+        end vpcd knows that the card is gone, unless that takes it as long again."""
         try:
-            while True:
+            # The connection alone stands before vpcd knows of it. Its first message tells.
+            async with asyncio.timeout(patience):
                 message = await self._receive()
-                if not accepted.done():
-                    accepted.set_result(None)
+            accepted.set_result(None)
+            while True:
                 await self._handle(message)
+                message = await self._receive()
         except (asyncio.IncompleteReadError, ConnectionError):
+            pass
+        finally:
+            await self._hang_up(patience)
+
+    async def _hang_up(self, patience: float) -> None:
+        # vpcd looks at its card now and then; when it hangs up as well, it has noticed.
+        try:
+            self._outgoing.write_eof()
+            async with asyncio.timeout(patience):
+                while await self._incoming.read(1000):
+                    pass
+        except (OSError, TimeoutError):
             pass
         finally:
             self._outgoing.close()
