@@ -2,11 +2,12 @@
 //
 // The worker serves one request at a time; others wait. A worker that ends, breaks its word or
 // takes longer than the limit of a reading or a proof is ended, fails what it was asked for, and is
-// started anew for the next request. Without a request for a while it is ended as well, so that its memory comes back.
+// started anew for the next request. Without a request for a while it is ended as well, so that its
+// memory comes back.
 //
-// A listing that takes longer than its askers wait, because a card is slow to read or because a proof
-// (which may wait for a person at a PIN pad) is before it, is answered with the tokens that the
-// module had last. The reading goes on, and the next listing has what it found.
+// A listing that takes longer than its askers wait, because a card is slow to read or because a
+// proof (which may wait for a person at a PIN pad) is before it, is answered with the tokens that
+// the module had last. The reading goes on, and the next listing has what it found.
 //
 // Threads: the event loop's. Answers come from the loop, exactly once each, never before the
 // asking call has returned; at the end of the worker's life those that are missing do not come.
@@ -56,7 +57,7 @@ public:
 
 private:
     struct Job {
-        std::optional<ProofRequest> proof;  // none: a listing
+        std::optional<ProofRequest> proof;          // none: a listing
         std::function<void(const Tokens&)> listed;  // empty once the asker waits no longer
         std::function<void(Proof)> proved;
         EventSource limit;

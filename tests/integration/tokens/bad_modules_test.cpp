@@ -61,7 +61,7 @@ TEST_F(BadModulesTest, OneThatHangsCostsItsTimeLimitAndOneWarning) {
     ASSERT_THAT(list(), SizeIs(1));
     dropTokens();
     configureModule("hanging");
-    options.limits.list = 2s;
+    options.limits.list = options.limits.read = 2s;
     const auto start = std::chrono::steady_clock::now();
 
     const auto all = list();
@@ -70,6 +70,23 @@ TEST_F(BadModulesTest, OneThatHangsCostsItsTimeLimitAndOneWarning) {
     EXPECT_LT(std::chrono::steady_clock::now() - start, 10s);
     EXPECT_THAT(warnings(),
                 ElementsAre(HasSubstr("the card module hanging did not answer in time")));
+}
+
+TEST_F(BadModulesTest, OneThatIsSlowIsListedWithoutUntilItHasAnswered) {
+    const auto gate = cards.folder() / "gate";
+    options.environment.push_back("VLM_TEST_SLOW=" + gate.string());
+    options.limits.list = 100ms;
+    options.limits.read = 60s;
+    configureOnly("slow");
+
+    EXPECT_THAT(list(), IsEmpty());
+    EXPECT_THAT(list(), IsEmpty()) << "whoever asks while it is read waits no longer either";
+    std::ofstream(gate) << "open";
+    std::vector<Token> listed;
+    while (listed.empty()) listed = list();
+
+    EXPECT_THAT(namesOf(listed), ElementsAre("good"));
+    EXPECT_THAT(warnings(), IsEmpty()) << "it was not ended";
 }
 
 TEST_F(BadModulesTest, OneThatLiesAboutSizesIsReadWithinBounds) {
