@@ -56,10 +56,14 @@ class CardInReader:
         length = int.from_bytes(await self._incoming.readexactly(2), "big")
         return await self._incoming.readexactly(length)
 
-    async def gone(self) -> None:
-        """Returns when the card has hung up; then vpcd does, too."""
+    async def end(self) -> None:
+        """Returns when the card has hung up."""
         while await self._incoming.read(1000):
             pass
+
+    async def gone(self) -> None:
+        """Hangs up as vpcd does: after the card."""
+        await self.end()
         self.close()
 
     def close(self) -> None:

@@ -27,9 +27,9 @@ class ReadersTestCase(unittest.IsolatedAsyncioTestCase):
         self.ports = [await vpcd.listen() for vpcd in self.vpcds]
         await self.start()
 
-    async def start(self, patience: float = 30) -> None:
+    async def start(self, patience: float = 30, empty_at_least: float = 0) -> None:
         """Begins to serve, in the place of a program that did so before."""
-        readers = Readers(self.cards, self.ports, Times(patience, empty_at_least=0))
+        readers = Readers(self.cards, self.ports, Times(patience, empty_at_least))
         server = await Control(readers).listen(self.socket)
         self.addAsyncCleanup(readers.close)
         self.addCleanup(server.close)

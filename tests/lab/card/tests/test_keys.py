@@ -49,7 +49,8 @@ class Keys(CardTestCase):
         request = sign_request(PADDED)
 
         card.send(frame(0x87, 0x079A, request[:200], cla=0x10))
-        card.verify(PIN)
+
+        self.assertEqual(card.verify(PIN), 0x9000)
 
         self.assertEqual(card.status(frame(0x87, 0x079A, request[200:])), 0x6A80)
 

@@ -141,6 +141,13 @@ class Pin(CardTestCase):
         self.assertEqual(again.verify(OTHER_PIN), 0x9000)
         self.assertEqual(again.status(unblock(WRONG_PUK, PIN)), 0x63C1)
 
+    def test_a_card_remembers_that_it_was_unblocked(self) -> None:
+        card = self.selected("ec")
+        self.block(card)
+        card.status(unblock(PUK, OTHER_PIN))
+
+        self.assertEqual(self.selected("ec").verify(OTHER_PIN), 0x9000)
+
     def test_nothing_half_written_is_left_beside_the_memory(self) -> None:
         self.selected("ec").verify(WRONG_PIN)
 

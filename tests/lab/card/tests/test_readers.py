@@ -91,11 +91,23 @@ class Inserting(ReadersTestCase):
         card = await self.insert("ec")
 
         answer = asyncio.create_task(self.tell("remove"))
+        await card.end()
         self.assertEqual(await self.tell("status"), "ok 1=ec 2=-")
         self.assertFalse(answer.done())
-        await card.gone()
+        card.close()
 
         self.assertEqual(await answer, "ok")
+
+    async def test_a_reader_stays_empty_until_everybody_saw_it(self) -> None:
+        await self.start(empty_at_least=0.2)
+        await self.pull(await self.insert("ec"))
+        clock = asyncio.get_running_loop().time
+        emptied = clock()
+
+        await self.insert("ec")
+
+        # What the test itself takes from the removal to its own clock is not much.
+        self.assertGreater(clock() - emptied, 0.1)
 
     async def test_an_occupied_reader_and_a_card_in_use_are_refused(self) -> None:
         await self.insert("ec")
@@ -127,10 +139,16 @@ class TwoCards(ReadersTestCase):
         quick = await self.insert("ec", 2)
 
         slow.send(bench.SELECT)
+        answer = asyncio.create_task(slow.answer())
         await self.verify(quick)
 
+        self.assertFalse(answer.done())
         self.assertEqual(await self.tell("status"), "ok 1=slow 2=ec")
-        await self.pull(slow)
+        pulled = asyncio.create_task(self.tell("remove"))
+        with self.assertRaises(asyncio.IncompleteReadError):
+            await answer
+        slow.close()
+        self.assertEqual(await pulled, "ok")
         self.assertEqual(await self.tell("status"), "ok 1=- 2=ec")
 
 
