@@ -68,6 +68,8 @@ TEST_F(LogindConsoleSessionsTest, PutsOnlyTheActiveUserOfTheFirstSeatOnTheConsol
     const Row rows[] = {
         {"a user in front", "CLASS=user\nSEAT=seat0\nACTIVE=1\nSTATE=active\n", true},
         {"a user in the background", "CLASS=user\nSEAT=seat0\nACTIVE=0\nSTATE=online\n", false},
+        {"a user who has left a program behind",
+         "CLASS=user\nSEAT=seat0\nACTIVE=1\nSTATE=closing\n", false},
         {"a remote user", "CLASS=user\nACTIVE=1\nSTATE=active\nREMOTE=1\n", false},
         {"a user at another seat", "CLASS=user\nSEAT=seat1\nACTIVE=1\nSTATE=active\n", false},
         {"the login screen", "CLASS=greeter\nSEAT=seat0\nACTIVE=1\nSTATE=active\n", false},

@@ -95,6 +95,11 @@ class Desktop:
         image = f"/run/user/$(id -u {user})/shot.png"
         return self.container.run(["sh", "-c", f"cat {image}; rm {image}"], capture_output=True).stdout
 
+    def windows(self, *words: str) -> str:
+        """What assistive programs see at the console; the program's own text has the words."""
+        program = "/usr/lib/vlm-lab/desktop/windows"
+        return self.user(self._user_at_console(), program, *words).output
+
     def wait_until(self, what: str, reached, seconds: float = PATIENCE_SECONDS):
         """The first answer of reached() that counts as true."""
         end = time.monotonic() + seconds

@@ -6,6 +6,7 @@ name says what must be true. It fails by raising.
 
 import importlib.util
 import inspect
+import os
 import sys
 import time
 import traceback
@@ -47,8 +48,14 @@ def _scenarios_of(file: Path) -> dict:
     }
 
 
+def _machine_name(scenario: str) -> str:
+    """A host's name, and nobody else's."""
+    words = scenario.replace("_", "-").replace(".", "-")
+    return f"{words[:40].rstrip('-')}-{os.getpid()}"
+
+
 def _passes(name: str, scenario, build: Path) -> bool:
-    container = Container(name.replace("_", "-").replace(".", "-")[:48])
+    container = Container(_machine_name(name))
     began = time.monotonic()
     try:
         container.up(build, ends_with_us=True)
