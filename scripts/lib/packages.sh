@@ -10,9 +10,12 @@ demo_packages=(dbus opensc openssl p11-kit-modules softhsm2)
 
 test_packages=(
     gcovr git gnutls-bin libgmock-dev libgtest-dev mandoc p11-kit pinentry-tty procps
-    python3-cryptography shellcheck systemd
-    clang clang-format clang-tidy libclang-rt-14-dev
+    python3-cryptography systemd
+    black clang clang-format clang-tidy libclang-rt-14-dev pyflakes3 shellcheck
 )
+
+# What boots a container with a desktop in it.
+lab_packages=(mmdebstrap systemd-container)
 
 # install_packages NAME... : installs those that are missing, and asks nothing.
 install_packages() {

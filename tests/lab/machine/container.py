@@ -34,13 +34,16 @@ class Container:
 
     def up(self, build: Path, ends_with_us: bool = False) -> None:
         """Boots; returns when the machine and the desktop at its console are ready. A machine that
-        ends with us does so however this process ends."""
+        ends with us does so however this process ends; what is left then, the next one clears."""
         if self.is_up():
             raise LabError(f"the machine {self.name} is up already")
         self.down()
+        _clear_orphans()
         layers = image.layers()
         self._state.mkdir(parents=True)
         try:
+            if ends_with_us:
+                (self._state / "owner").write_text(str(os.getpid()))
             installed = self._state / "installed"
             install(build, installed)
             self._boot([installed, *layers], ends_with_us)
@@ -132,9 +135,17 @@ def install(build: Path, target: Path) -> None:
             raise LabError(f"{command[0]} failed:\n{done.stdout}{done.stderr}")
 
 
+def _clear_orphans() -> None:
+    for owner in STATES.glob("*/owner"):
+        pid = _number_in(owner)
+        if pid and not Path(f"/proc/{pid}").exists():
+            Container(owner.parent.name).down()
+
+
 def _end_with_parent() -> None:
+    """On this signal systemd-nspawn halts its machine; killed, it would leave it running."""
     PR_SET_PDEATHSIG = 1
-    ctypes.CDLL(None).prctl(PR_SET_PDEATHSIG, signal.SIGKILL)
+    ctypes.CDLL(None).prctl(PR_SET_PDEATHSIG, signal.SIGTERM)
 
 
 def _number_in(file: Path) -> int | None:

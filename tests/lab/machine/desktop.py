@@ -55,7 +55,9 @@ class Desktop:
         status = process.wait(3 * PATIENCE_SECONDS)
         return Done(" ".join(command), status, shown.replace("\r\n", "\n"), "")
 
-    def command_for(self, user: str | None, command: list[str], terminal: bool = False) -> list[str]:
+    def command_for(
+        self, user: str | None, command: list[str], terminal: bool = False
+    ) -> list[str]:
         if user and not self._has_desktop(user):
             afar = ["ssh", "-q", "-tt" if terminal else "-T", f"{user}@localhost"]
             return self.container.command([*afar, "--", shlex.join(command)])
@@ -93,7 +95,9 @@ class Desktop:
         if taken.status != 0:
             raise LabError(f"no screenshot: {taken.output}")
         image = f"/run/user/$(id -u {user})/shot.png"
-        return self.container.run(["sh", "-c", f"cat {image}; rm {image}"], capture_output=True).stdout
+        return self.container.run(
+            ["sh", "-c", f"cat {image}; rm {image}"], capture_output=True
+        ).stdout
 
     def windows(self, *words: str) -> str:
         """What assistive programs see at the console; the program's own text has the words."""
@@ -110,7 +114,9 @@ class Desktop:
         return answer
 
     def _user_at_console(self) -> str:
-        active = self._inside("loginctl", "show-seat", "seat0", "--property=ActiveSession", "--value")
+        active = self._inside(
+            "loginctl", "show-seat", "seat0", "--property=ActiveSession", "--value"
+        )
         if not active.strip():
             raise LabError("nobody is at the console")
         show = ["loginctl", "show-session", active.strip(), "--property=Name", "--value"]

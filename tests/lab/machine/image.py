@@ -20,6 +20,10 @@ CACHE = Path(os.environ.get("VLM_LAB_CACHE", "/var/cache/vlm-lab"))
 KEPT_SECONDS = 14 * 24 * 3600
 
 
+class ImageError(Exception):
+    """Why the layers cannot be made, for the person who runs the lab."""
+
+
 def packages() -> list[str]:
     lines = (LAB / "image/packages").read_text().splitlines()
     return [line for line in lines if line and not line.startswith("#")]
@@ -67,7 +71,7 @@ def _remove(folder: Path) -> None:
 def _codename() -> str:
     release = platform.freedesktop_os_release()
     if release.get("ID") != "debian":
-        raise RuntimeError("the lab's machine is made of Debian packages, and this is no Debian")
+        raise ImageError("the lab's machine is made of Debian packages, and this is no Debian")
     return release["VERSION_CODENAME"]
 
 
@@ -129,4 +133,4 @@ def _run(command: list[str]) -> None:
     done = subprocess.run(command, stdin=subprocess.DEVNULL, capture_output=True, text=True)
     if done.returncode != 0:
         said = "\n".join((done.stdout + done.stderr).strip().splitlines()[-20:])
-        raise RuntimeError(f"{command[0]} failed:\n{said}")
+        raise ImageError(f"{command[0]} failed:\n{said}")

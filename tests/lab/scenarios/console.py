@@ -53,7 +53,9 @@ def nobody_is_at_the_console_when_alice_has_left(lab):
 
 def who_left_a_program_behind_has_left(lab):
     _leave_console(lab, "alice")
-    session = ["--property=User=bob", "--property=PAMName=login", "--setenv=XDG_SEAT=seat0"]
+    session = ["--property=User=bob", "--property=PAMName=login"]
+    for name, value in (("SEAT", "seat0"), ("SESSION_TYPE", "x11"), ("SESSION_CLASS", "user")):
+        session.append(f"--setenv=XDG_{name}={value}")
     leave = "setsid sleep 60 & until test -e /tmp/leave; do sleep 0.1; done"
     lab.root("systemd-run", "--quiet", *session, "sh", "-c", leave)
     lab.wait_until("bob has come", lambda: _seen(lab) == ["bob", "bob console"])

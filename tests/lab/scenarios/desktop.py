@@ -59,11 +59,24 @@ def a_window_is_seen_on_the_screen_and_by_assistive_programs(lab):
     check.assertEqual(struct.unpack(">II", empty[16:24]), (1280, 800))
 
     # The keyring's own window: it asks for the password of a keyring that was locked.
-    lab.user("alice", *"busctl --user call org.freedesktop.secrets /org/freedesktop/secrets".split(),
-             *"org.freedesktop.Secret.Service Lock ao 1".split(),
-             "/org/freedesktop/secrets/collection/login")
-    lab.root("systemd-run", "--user", "--machine=alice@", "--quiet", "--collect",
-             "secret-tool", "store", "--label=x", "lab", "y")
+    lab.user(
+        "alice",
+        *"busctl --user call org.freedesktop.secrets /org/freedesktop/secrets".split(),
+        *"org.freedesktop.Secret.Service Lock ao 1".split(),
+        "/org/freedesktop/secrets/collection/login",
+    )
+    lab.root(
+        "systemd-run",
+        "--user",
+        "--machine=alice@",
+        "--quiet",
+        "--collect",
+        "secret-tool",
+        "store",
+        "--label=x",
+        "lab",
+        "y",
+    )
     lab.wait_until("the window is there", lambda: "Unlock" in lab.windows())
 
     check.assertIn("password text", lab.windows())

@@ -27,7 +27,9 @@ def no_network_socket_is_opened(lab):
 
 
 def other_peoples_files_are_not_read_not_even_by_root(lab):
-    lab.root("sh", "-c", "echo secret >/home/bob/diary; chmod 644 /home/bob/diary; chmod 755 /home/bob")
+    lab.root(
+        "sh", "-c", "echo secret >/home/bob/diary; chmod 644 /home/bob/diary; chmod 755 /home/bob"
+    )
     for user in ("alice", None):
         _attempt(lab, user, DENIED, "read", "/home/bob/diary")
     lab.root("vlmbind", "-i")

@@ -101,7 +101,9 @@ def _main_pid(lab) -> str:
 
 
 def _leave_soon(lab) -> None:
-    lines = r"[Service]\nExecStart=\nExecStart=/usr/libexec/vlm/vlmhintsd --system --idle-seconds 1\n"
+    lines = (
+        r"[Service]\nExecStart=\nExecStart=/usr/libexec/vlm/vlmhintsd --system --idle-seconds 1\n"
+    )
     folder = f"/run/systemd/system/{SERVICE}.d"
     lab.root("sh", "-c", f"mkdir -p {folder} && printf '{lines}' >{folder}/soon.conf")
     lab.root("systemctl", "daemon-reload")

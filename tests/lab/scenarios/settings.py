@@ -36,9 +36,7 @@ def root_has_no_such_switch(lab):
     refused = lab.root("vlmbind", "-s", "status")
 
     check.assertEqual(refused.status, 255)
-    check.assertEqual(
-        refused.output, "This operation must not be run with root privileges.\n"
-    )
+    check.assertEqual(refused.output, "This operation must not be run with root privileges.\n")
 
 
 def root_sets_and_users_read_the_machines_settings(lab):
@@ -58,7 +56,9 @@ def a_managed_value_rules_and_is_not_written(lab):
     lab.root("vlmctl", "set", "oneCardPerUser", "false")
     _manage(lab)
 
-    check.assertRegex(lab.user("alice", "vlmctl", "settings").output, r"oneCardPerUser +1 +managed\n")
+    check.assertRegex(
+        lab.user("alice", "vlmctl", "settings").output, r"oneCardPerUser +1 +managed\n"
+    )
     refused = lab.root("vlmctl", "set", "oneCardPerUser", "false")
     check.assertNotEqual(refused.status, 0)
     check.assertIn("managed", refused.errors)
