@@ -79,7 +79,7 @@ TEST_F(LeavingTest, WaitsForTheEndOfAPinPrompt) {
     Child login(machine.callCommand(kDaemon, machine.login()), machine.options());
     ASSERT_TRUE(eventually([&] { return std::filesystem::exists(asked); }));
 
-    EXPECT_TRUE(stays(machine.daemonConnection()));
+    ASSERT_TRUE(stays(machine.daemonConnection()));
 
     std::ofstream(go) << "123456\n";
     EXPECT_EQ(login.wait(), 0);
