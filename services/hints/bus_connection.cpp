@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <utility>
 
 #include "platform/text.h"
 #include "services/hints/status.h"
@@ -51,6 +52,19 @@ std::string BusConnection::claim(const std::string& name) {
     return platform::text("the bus does not give the name {} ({})", name, std::strerror(-code));
 }
 
+// The bus answers on the same way on which it delivers, so the answer comes after the last call.
+void BusConnection::release(std::function<void()> released) {
+    _released = std::move(released);
+    // It tells about this loss too.
+    _nameLost.reset();
+    sd_bus_slot* slot = nullptr;
+    const int code = sd_bus_release_name_async(_bus.get(), &slot, _name.c_str(), onReleased, this);
+    if (code < 0)
+        return _lost(
+            platform::text("the name {} cannot be given back ({})", _name, std::strerror(-code)));
+    _release.reset(slot);
+}
+
 bool BusConnection::match(const char* sender, const char* path, const char* interface,
                           const char* member, sd_bus_message_handler_t handler,
                           platform::SdBusSlot& slot) {
@@ -71,6 +85,17 @@ int BusConnection::onNameLost(sd_bus_message* signal, void* self, sd_bus_error*)
     const char* name = nullptr;
     if (sd_bus_message_read(signal, "s", &name) < 0 || connection._name != name) return 0;
     connection._lost(platform::text("the name {} on the bus was lost", name));
+    return 0;
+}
+
+int BusConnection::onReleased(sd_bus_message* reply, void* self, sd_bus_error*) {
+    auto& connection = *static_cast<BusConnection*>(self);
+    if (const auto* error = sd_bus_message_get_error(reply))
+        connection._lost(platform::text("the bus does not take the name {} back ({})",
+                                        connection._name,
+                                        error->message ? error->message : error->name));
+    else
+        std::exchange(connection._released, nullptr)();
     return 0;
 }
 

@@ -34,11 +34,16 @@ public:
     // when it has.
     std::string claim(const std::string& name);
 
+    // Gives the name back. Calls once, when the bus has done so and all that came for the name has
+    // been handed out; later callers do not find this program, and the bus may start another.
+    void release(std::function<void()> released);
+
 private:
     BusConnection(platform::SdBus bus, Lost lost) : _bus(std::move(bus)), _lost(std::move(lost)) {}
 
     static int onDisconnected(sd_bus_message* signal, void* self, sd_bus_error* error);
     static int onNameLost(sd_bus_message* signal, void* self, sd_bus_error* error);
+    static int onReleased(sd_bus_message* reply, void* self, sd_bus_error* error);
     bool match(const char* sender, const char* path, const char* interface, const char* member,
                sd_bus_message_handler_t handler, platform::SdBusSlot& slot);
 
@@ -47,6 +52,8 @@ private:
     std::string _name;
     platform::SdBusSlot _disconnected;
     platform::SdBusSlot _nameLost;
+    std::function<void()> _released;
+    platform::SdBusSlot _release;
 };
 
 }  // namespace vlm::service

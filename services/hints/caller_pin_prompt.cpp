@@ -1,12 +1,15 @@
 #include "services/hints/caller_pin_prompt.h"
 
 #include <algorithm>
+#include <chrono>
+#include <functional>
 #include <utility>
 
 #include "platform/console_sessions.h"
 #include "platform/platform.h"
 #include "platform/text.h"
 #include "services/hints/bus_call.h"
+#include "services/hints/hints_log.h"
 #include "services/hints/pinentry.h"
 #include "services/hints/pinentry_program.h"
 #include "services/hints/prompter_messages.h"
@@ -16,6 +19,8 @@
 namespace vlm::service {
 
 namespace {
+
+using namespace std::chrono_literals;
 
 // A question that a user's instance asks. It withdraws it when our connection leaves the bus.
 class RemoteQuestion final : public PinPrompt::Question {
@@ -39,16 +44,41 @@ private:
 
 class NobodyToAsk final : public PinPrompt::Question {
 public:
-    NobodyToAsk(sd_event* event, const PinPrompt::Answer& answer)
-        : _later(callSoon(event, [answer] {
-              answer({PinAnswer::Outcome::Unavailable,
-                      {},
-                      "there is no terminal and no desktop to ask on. Run the command in a "
-                      "terminal, or give the PIN with the request"});
+    NobodyToAsk(sd_event* event, const char* why, const PinPrompt::Answer& answer)
+        : _later(callSoon(event, [why, answer] {
+              answer({PinAnswer::Outcome::Unavailable, {}, why});
           })) {}
 
 private:
     EventSource _later;
+};
+
+constexpr const char* kNowhere =
+    "there is no terminal and no desktop to ask on. Run the command in a terminal, or give the PIN "
+    "with the request";
+constexpr const char* kEnding = "the service was about to end after a quiet time. Try again";
+
+// A question that is asked when the user's instance has registered, or its time for that is over.
+class LateQuestion final : public PinPrompt::Question {
+public:
+    using Ask = std::function<std::unique_ptr<PinPrompt::Question>()>;
+
+    LateQuestion(sd_event* event, PrompterRegistry& prompters, platform::UserId user, Ask ask)
+        : _ask(std::move(ask)),
+          _registered(prompters.callWhenRegistered(user, [this] { askNow(); })),
+          _timeOver(callAfter(event, prompters.timeLeftToRegister(), [this] { askNow(); })) {}
+
+private:
+    void askNow() {
+        _registered.reset();
+        _timeOver.reset();
+        _question = std::exchange(_ask, nullptr)();
+    }
+
+    Ask _ask;
+    PrompterRegistry::Waiting _registered;
+    EventSource _timeOver;
+    std::unique_ptr<PinPrompt::Question> _question;
 };
 
 // The first one counts. Root at the console is nobody: no desktop is asked on root's behalf there.
@@ -60,16 +90,34 @@ std::optional<platform::UserId> userAtConsole() {
     return found->userId;
 }
 
+// Whose desktop is asked on.
+std::optional<platform::UserId> desktopUserFor(const Caller& caller) {
+    return caller.isRoot() ? userAtConsole() : caller.user;
+}
+
 }  // namespace
 
 std::unique_ptr<PinPrompt::Question> CallerPinPrompt::ask(const PinQuestion& question,
                                                           Answer answer) {
+    if (_isEnding) return std::make_unique<NobodyToAsk>(_event, kEnding, answer);
     if (auto terminal = Terminal::of(question.caller))
         return askHere(std::move(terminal), question, std::move(answer));
-    if (const auto prompter = prompterFor(question.caller))
+    const auto user = desktopUserFor(question.caller);
+    if (!user || _prompters.prompterOf(*user) || _prompters.timeLeftToRegister() == 0ms)
+        return askElsewhere(user, question, std::move(answer));
+    kLog.info("waiting for the hints service of user {} to register", *user);
+    return std::make_unique<LateQuestion>(_event, _prompters, *user,
+                                          [this, user, question, answer = std::move(answer)] {
+                                              return askElsewhere(user, question, answer);
+                                          });
+}
+
+std::unique_ptr<PinPrompt::Question> CallerPinPrompt::askElsewhere(
+    std::optional<platform::UserId> user, const PinQuestion& question, Answer answer) {
+    if (const auto prompter = user ? _prompters.prompterOf(*user) : std::nullopt)
         return std::make_unique<RemoteQuestion>(_event, *prompter, question, answer);
     if (!_namedPinentry.empty()) return askHere(std::nullopt, question, std::move(answer));
-    return std::make_unique<NobodyToAsk>(_event, answer);
+    return std::make_unique<NobodyToAsk>(_event, kNowhere, answer);
 }
 
 std::unique_ptr<PinPrompt::Question> CallerPinPrompt::askHere(std::optional<Terminal> terminal,
@@ -77,12 +125,6 @@ std::unique_ptr<PinPrompt::Question> CallerPinPrompt::askHere(std::optional<Term
                                                               Answer answer) {
     return Pinentry::start(_event, pinentryFor(question.caller, _namedPinentry),
                            std::move(terminal), question, std::move(answer));
-}
-
-std::optional<std::string> CallerPinPrompt::prompterFor(const Caller& caller) const {
-    if (!caller.isRoot()) return _prompters.prompterOf(caller.user);
-    const auto user = userAtConsole();
-    return user ? _prompters.prompterOf(*user) : std::nullopt;
 }
 
 }  // namespace vlm::service

@@ -93,7 +93,7 @@ void HintsService::login(const Caller& caller, Request request, const Answer& an
     const auto hash = request.hash;
     const auto done = [this, number, user = caller.user, hash,
                        answer](const std::optional<Refusal>& refusal) {
-        if (!refusal) _proofs.remember(user, hash);
+        if (!refusal) _parts.proofs.remember(user, hash);
         // Last the answer: it may be the last thing that this service does.
         const auto ended = _logins.extract(number);
         if (refusal) return answer(*refusal);
@@ -129,13 +129,13 @@ Outcome<Message> HintsService::describeTokens(const Caller& caller, const std::s
 Outcome<Message> HintsService::pair(const Caller& caller, const Request& request) {
     const auto account = spelling(request.account);
     if (!account) return refused(status::kNoSuchAccount, request, "there is no such account.");
-    if (!_proofs.hold(caller.user, request.hash))
+    if (!_parts.proofs.hold(caller.user, request.hash))
         return refused(status::kNotProved, request,
                        "a card has to sign with this key first. Log in with the card, and pair "
                        "within a minute.");
     if (const auto failure = _parts.pairings.pair(*account, request.hash, _parts.now()))
         return *failure;
-    _proofs.useUp(caller.user, request.hash);
+    _parts.proofs.useUp(caller.user, request.hash);
     kLog.notice("paired {} with {} for user {}", platform::harmlessText(*account),
                 platform::hexadecimal(request.hash), caller.user);
     return numberReply(status::kSuccess);

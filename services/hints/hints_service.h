@@ -29,11 +29,11 @@ public:
         LoginParts login;
         PairingStore& pairings;
         CallerWatch& callers;
-        Proofs::Clock milliseconds;         // never goes back
+        Proofs& proofs;
         std::function<std::int64_t()> now;  // seconds since 1970-01-01 00:00:00 UTC
     };
 
-    explicit HintsService(Parts parts) : _parts(std::move(parts)), _proofs(_parts.milliseconds) {}
+    explicit HintsService(Parts parts) : _parts(std::move(parts)) {}
 
     void handle(const Caller& caller, const IncomingRequest& request, Reply reply) override;
 
@@ -56,7 +56,6 @@ private:
     Outcome<platform::Message> isPaired(const Request& request);
 
     Parts _parts;
-    Proofs _proofs;
     std::map<std::uint64_t, Running> _logins;
     std::uint64_t _lastLogin = 0;
 

@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
+#include <cmath>
 #include <string_view>
 
 #include "platform/text.h"
@@ -30,6 +32,8 @@ they are paired with.
                        (default: vlm-token-worker, beside this program)
   --modules FOLDER     read which card modules there are from this folder only
                        (default: the folders of pkcs11.conf(5))
+  --idle-seconds N     end after so many seconds without work, fractions too; whoever
+                       asks next starts the service again; 0 is never (default: {})
   --help               print this and end
   --version            print the version and end
 
@@ -49,9 +53,28 @@ constexpr std::array kPathOptions = {
     PathOption{"--modules", &Options::moduleFolder, false},
 };
 
+constexpr std::string_view kIdleOption = "--idle-seconds";
+constexpr double kMostIdleSeconds = 86'400;
+
 ParsedOptions wrong(std::string_view why) {
     return {std::nullopt, platform::text("vlmhintsd: {}. Try \"vlmhintsd --help\".\n", why),
             kUsageError};
+}
+
+std::optional<std::chrono::milliseconds> readIdleTime(const std::optional<std::string>& text) {
+    if (!text) return std::nullopt;
+    double seconds = NAN;
+    const char* const end = text->data() + text->size();
+    const auto read = std::from_chars(text->data(), end, seconds, std::chars_format::fixed);
+    if (read.ec != std::errc() || read.ptr != end) return std::nullopt;
+    if (!(seconds >= 0 && seconds <= kMostIdleSeconds)) return std::nullopt;
+    // Upwards: a time that is short beyond measure is not "never".
+    return std::chrono::ceil<std::chrono::milliseconds>(std::chrono::duration<double>(seconds));
+}
+
+std::string help() {
+    const auto idleTime = std::chrono::floor<std::chrono::seconds>(Options().idleTime);
+    return platform::text(kHelp, SqlitePairingStore::kUsualPath, idleTime.count());
 }
 
 // Takes "--name value" and "--name=value" off the head of the arguments.
@@ -101,9 +124,19 @@ ParsedOptions parseOptions(const std::vector<std::string>& given) {
             if (!path->isForUserToo) systemOnly = path->name;
             continue;
         }
+        if (name == kIdleOption) {
+            const auto time = readIdleTime(arguments.takeValue());
+            if (!time)
+                return wrong(
+                    platform::text("{} needs a number of seconds from 0, which is never, "
+                                   "to {}",
+                                   kIdleOption, kMostIdleSeconds));
+            options.idleTime = *time;
+            systemOnly = kIdleOption;
+            continue;
+        }
         if (arguments.hasValue()) return wrong(platform::text("{} takes no value", name));
-        if (name == "--help")
-            return {std::nullopt, platform::text(kHelp, SqlitePairingStore::kUsualPath), 0};
+        if (name == "--help") return {std::nullopt, help(), 0};
         if (name == "--version") return {std::nullopt, "vlmhintsd " VLM_VERSION "\n", 0};
         if (name != "--system" && name != "--user")
             return wrong(platform::text("there is no option {}", name));

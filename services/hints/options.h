@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <optional>
 #include <string>
 #include <vector>
@@ -14,6 +15,7 @@ struct Options {
     std::string pinentry;      // empty for the machine's usual program
     std::string worker;        // empty for the one beside this program
     std::string moduleFolder;  // empty for the machine's own list of card modules
+    std::chrono::milliseconds idleTime{120'000};  // quiet for so long, the daemon leaves; 0: never
 };
 
 // Either options to run with, or a text to print and the exit status to end with.

@@ -1,5 +1,6 @@
 #include "services/hints/prompter_registry.h"
 
+#include <algorithm>
 #include <utility>
 
 #include "services/hints/bus_caller.h"
@@ -19,6 +20,7 @@ bool PrompterRegistry::start() {
     if (sd_bus_add_object_vtable(_bus, &slot, kObjectPath, kPromptersInterface, kMembers, this) < 0)
         return false;
     _slot.reset(slot);
+    _registrationEnds = _clock() + kTimeToRegister.count();
     return true;
 }
 
@@ -26,6 +28,17 @@ std::optional<std::string> PrompterRegistry::prompterOf(platform::UserId user) c
     const auto found = _prompters.find(user);
     if (found == _prompters.end()) return std::nullopt;
     return found->second.connection;
+}
+
+std::chrono::milliseconds PrompterRegistry::timeLeftToRegister() const {
+    return std::chrono::milliseconds(std::max(_registrationEnds - _clock(), std::int64_t{0}));
+}
+
+PrompterRegistry::Waiting PrompterRegistry::callWhenRegistered(platform::UserId user,
+                                                               std::function<void()> call) {
+    auto waiting = std::make_shared<const std::function<void()>>(std::move(call));
+    _waiting.emplace(user, waiting);
+    return waiting;
 }
 
 int PrompterRegistry::onRegister(sd_bus_message* call, void* self, sd_bus_error*) {
@@ -44,6 +57,8 @@ void PrompterRegistry::add(platform::UserId user, const std::string& connection)
     if (!watch) return;
     _prompters[user] = {connection, std::move(watch)};
     kLog.info("user {} is asked for PINs through {}", user, connection);
+    while (const auto waiting = _waiting.extract(user))
+        if (const auto call = waiting.mapped().lock()) (*call)();
 }
 
 }  // namespace vlm::service

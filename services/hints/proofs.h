@@ -7,6 +7,8 @@
 
 #pragma once
 
+#include <algorithm>
+#include <chrono>
 #include <cstdint>
 #include <functional>
 #include <map>
@@ -35,6 +37,13 @@ public:
     }
 
     void useUp(platform::UserId user, const platform::Bytes& hash) { _endOf.erase({user, hash}); }
+
+    // Until the last of them has ended; zero when none waits for its pairing.
+    std::chrono::milliseconds timeLeft() const {
+        std::int64_t left = 0;
+        for (const auto& proof : _endOf) left = std::max(left, proof.second - _clock());
+        return std::chrono::milliseconds(left);
+    }
 
 private:
     Clock _clock;

@@ -41,6 +41,8 @@ int ServiceLoop::run() {
     return status < 0 ? EXIT_FAILURE : status;
 }
 
+void ServiceLoop::end() { sd_event_exit(_event.get(), EXIT_SUCCESS); }
+
 void ServiceLoop::fail(const std::string& reason) {
     kLog.error("ending: {}", reason);
     sd_event_exit(_event.get(), EXIT_FAILURE);

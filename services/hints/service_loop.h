@@ -18,6 +18,9 @@ public:
     // Runs until the loop is ended; the program's exit status.
     int run();
 
+    // Ends the loop, as a success.
+    void end();
+
     // Ends the loop as a failure, with one line in the log.
     void fail(const std::string& reason);
 

@@ -1,4 +1,5 @@
 #include <sys/random.h>
+#include <systemd/sd-daemon.h>
 
 #include <chrono>
 #include <filesystem>
@@ -8,7 +9,10 @@
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_server.h"
 #include "services/hints/caller_pin_prompt.h"
+#include "services/hints/counted_work.h"
+#include "services/hints/hints_log.h"
 #include "services/hints/hints_service.h"
+#include "services/hints/idleness.h"
 #include "services/hints/instances.h"
 #include "services/hints/prompter_registry.h"
 #include "services/hints/service_names.h"
@@ -51,6 +55,30 @@ WorkerTokensOptions workersFor(const Options& options) {
     return workers;
 }
 
+Idleness::Parts idlenessOf(sd_event* event, const Options& options, const Proofs& proofs) {
+    return {.enough = options.idleTime,
+            .untilProofsEnd = [&proofs] { return proofs.timeLeft(); },
+            .callAfter =
+                [event](std::chrono::milliseconds delay, std::function<void()> call) {
+                    auto timer = callAfter(event, delay, std::move(call));
+                    // A call that is there when the time is over is served first, and ends the
+                    // quiet.
+                    sd_event_source_set_priority(timer.get(), SD_EVENT_PRIORITY_IDLE);
+                    return std::shared_ptr<void>(std::move(timer));
+                }};
+}
+
+// Whoever asks from now on starts the service anew; what came before is still answered. A PIN
+// prompt would keep the new one waiting for as long as a person takes.
+void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, Idleness& idleness) {
+    kLog.info("leaving after a quiet time");
+    // First, so that systemd neither ends this process for the loss of its name nor takes it for
+    // the one that serves.
+    sd_notify(0, "STOPPING=1");
+    prompt.askNobody();
+    bus.release([&] { idleness.callWhenDone([&] { loop.end(); }); });
+}
+
 }  // namespace
 
 InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
@@ -62,18 +90,23 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     sd_bus* const connection = (*bus)->get();
 
     BusCallerWatch callers(connection);
-    PrompterRegistry prompters(connection, callers);
-    WorkerTokens tokens(loop.get(), workersFor(options));
+    PrompterRegistry prompters(connection, callers, milliseconds);
+    Proofs proofs(milliseconds);
+    Idleness idleness(idlenessOf(loop.get(), options, proofs));
+    WorkerTokens cards(loop.get(), workersFor(options));
+    CountedTokens tokens(cards, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
                           .pairings = **pairings,
                           .callers = callers,
-                          .milliseconds = milliseconds,
+                          .proofs = proofs,
                           .now = secondsNow});
-    BusServer server(connection, kHintsInterface, "Exchange", service);
+    CountedExchanges requests(service, idleness);
+    BusServer server(connection, kHintsInterface, "Exchange", requests);
 
     if (!server.start() || !prompters.start()) return {"the bus does not take the service"};
     if (auto reason = (*bus)->claim(kDaemonName); !reason.empty()) return {reason};
+    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, idleness); });
     return {{}, loop.run()};
 }
 

@@ -66,11 +66,13 @@ PrivateBus::Options PrivateBus::underPolicy(const std::filesystem::path& policyF
     return options;
 }
 
-bool PrivateBus::hasOwner(const std::string& name) const {
+std::string PrivateBus::ownerOf(const std::string& name) const {
     const auto ended = run({"dbus-send", "--bus=" + _address, "--print-reply=literal",
-                            "--dest=org.freedesktop.DBus", "/", "org.freedesktop.DBus.NameHasOwner",
+                            "--dest=org.freedesktop.DBus", "/", "org.freedesktop.DBus.GetNameOwner",
                             "string:" + name});
-    return ended.output.find("true") != std::string::npos;
+    const auto begin = ended.output.find(':');
+    return begin == std::string::npos ? ""
+                                      : ended.output.substr(begin, ended.output.find('\n') - begin);
 }
 
 }  // namespace vlm::test

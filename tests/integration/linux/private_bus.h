@@ -33,7 +33,10 @@ public:
 
     const std::string& address() const { return _address; }
 
-    bool hasOwner(const std::string& name) const;
+    bool hasOwner(const std::string& name) const { return !ownerOf(name).empty(); }
+
+    // The unique name of the connection that has the name; empty when none has.
+    std::string ownerOf(const std::string& name) const;
 
     // The bus goes away, as after a crash.
     void stop() { _daemon.reset(); }

@@ -5,108 +5,33 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <systemd/sd-bus.h>
 #include <unistd.h>
 
-#include <deque>
 #include <memory>
 
-#include "platform/linux/sd_bus_message.h"
-#include "platform_test.h"
+#include "bus_test.h"
 #include "services/hints/bus_caller_watch.h"
 #include "services/hints/reply.h"
-#include "services/hints/service_names.h"
 #include "services/hints/status.h"
-#include "tests/integration/linux/private_bus.h"
 
 namespace vlm::service {
 namespace {
 
-// Keeps every request until the test answers it.
-class PatientExchanges final : public Exchanges {
-public:
-    struct Request {
-        Caller caller;
-        IncomingRequest request;
-        Reply reply;
-    };
-    std::deque<Request> waiting;
-
-    void handle(const Caller& caller, const IncomingRequest& request, Reply reply) override {
-        waiting.push_back({caller, request, std::move(reply)});
-    }
-};
-
-struct EventUnref {
-    void operator()(sd_event* event) const { sd_event_unref(event); }
-};
-
-class BusServerTest : public fakes::PlatformTest {
+class BusServerTest : public BusTest {
 protected:
-    BusServerTest() {
-        sd_event* made = nullptr;
-        sd_event_new(&made);
-        _event.reset(made);
-        serverBus = connect();
-        server =
-            std::make_unique<BusServer>(serverBus.get(), kHintsInterface, "Exchange", exchanges);
-        EXPECT_TRUE(server->start());
-    }
-
-    platform::SdBus connect() {
-        sd_bus* made = nullptr;
-        sd_bus_new(&made);
-        platform::SdBus connection(made);
-        sd_bus_set_address(made, _bus.address().c_str());
-        sd_bus_set_bus_client(made, 1);
-        EXPECT_GE(sd_bus_start(made), 0);
-        const char* name = nullptr;
-        EXPECT_GE(sd_bus_get_unique_name(made, &name), 0);
-        sd_bus_attach_event(made, _event.get(), 0);
-        return connection;
-    }
+    BusServerTest() { EXPECT_TRUE(server->start()); }
 
     void send(sd_bus* from, std::uint64_t operation) {
-        const char* to = nullptr;
-        sd_bus_get_unique_name(serverBus.get(), &to);
-        sd_bus_message* made = nullptr;
-        sd_bus_message_new_method_call(from, &made, to, kObjectPath, kHintsInterface, "Exchange");
-        const platform::SdBusMessage call(made);
-        platform::Message request;
-        request.set("op", operation);
-        std::string reason;
-        ASSERT_TRUE(platform::appendDictionary(made, request, reason)) << reason;
-        ASSERT_GE(sd_bus_call_async(from, nullptr, made, onReply, this, UINT64_MAX), 0);
-    }
-
-    void runUntil(const std::function<bool()>& isSo) {
-        while (!isSo()) ASSERT_GT(sd_event_run(_event.get(), 10'000'000), 0) << "nothing happens";
-    }
-    void runUntilQuiet() {
-        while (sd_event_run(_event.get(), 100'000) > 0) {
-        }
+        BusTest::send(from, nameOf(serverBus.get()), operation);
     }
     void answer(std::size_t which, std::int64_t number) {
         exchanges.waiting.at(which).reply(numberReply(number));
     }
 
-    static int onReply(sd_bus_message* message, void* self, sd_bus_error*) {
-        std::string reason;
-        const auto read = platform::readDictionary(message, reason);
-        static_cast<BusServerTest*>(self)->replies.push_back(
-            read ? read->message.integer("res").value_or(-1) : -2);
-        return 1;
-    }
-
-private:
-    test::PrivateBus _bus;
-    std::unique_ptr<sd_event, EventUnref> _event;
-
-protected:
     PatientExchanges exchanges;
-    platform::SdBus serverBus;
-    std::unique_ptr<BusServer> server;
-    std::vector<std::int64_t> replies;
+    platform::SdBus serverBus = connect();
+    std::unique_ptr<BusServer> server =
+        std::make_unique<BusServer>(serverBus.get(), kHintsInterface, "Exchange", exchanges);
 };
 
 TEST_F(BusServerTest, TellsWhoCallsFromWhatTheBusSays) {
@@ -116,11 +41,9 @@ TEST_F(BusServerTest, TellsWhoCallsFromWhatTheBusSays) {
     runUntil([&] { return !exchanges.waiting.empty(); });
 
     const auto& seen = exchanges.waiting[0].caller;
-    const char* name = nullptr;
-    sd_bus_get_unique_name(caller.get(), &name);
     EXPECT_EQ(seen.user, geteuid());
     EXPECT_EQ(seen.process, getpid());
-    EXPECT_EQ(seen.connection, name);
+    EXPECT_EQ(seen.connection, nameOf(caller.get()));
     EXPECT_EQ(exchanges.waiting[0].request.message.unsignedInteger("op"), 6u);
 }
 
@@ -208,9 +131,7 @@ TEST_F(BusServerTest, CountsNoRequestWhoseAnswerWasGivenUp) {
 TEST_F(BusServerTest, NoticesThatACallerLeaves) {
     BusCallerWatch callers(serverBus.get());
     auto caller = connect();
-    const char* name = nullptr;
-    sd_bus_get_unique_name(caller.get(), &name);
-    const std::string connection = name;
+    const auto connection = nameOf(caller.get());
     int left = 0;
     const auto watch = callers.watch(connection, [&] { ++left; });
     ASSERT_TRUE(watch);
@@ -227,11 +148,9 @@ TEST_F(BusServerTest, NoticesThatACallerLeaves) {
 TEST_F(BusServerTest, LetsAWatchBeDroppedByItsOwnCall) {
     BusCallerWatch callers(serverBus.get());
     auto caller = connect();
-    const char* name = nullptr;
-    sd_bus_get_unique_name(caller.get(), &name);
     std::unique_ptr<CallerWatch::Watch> watch;
     bool left = false;
-    watch = callers.watch(name, [&] {
+    watch = callers.watch(nameOf(caller.get()), [&] {
         watch.reset();
         left = true;
     });

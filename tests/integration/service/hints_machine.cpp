@@ -18,6 +18,13 @@ PrivateBus::Options sessionBusOptions() {
     return options;
 }
 
+PrivateBus::Options systemBusOptions(const fs::path& serviceFolder) {
+    auto options = PrivateBus::underPolicy(VLM_BUS_POLICY);
+    fs::create_directory(serviceFolder);
+    options.serviceFolders = {serviceFolder};
+    return options;
+}
+
 // The text between the first `left` and the next `right`; nothing when there is none.
 std::string between(const std::string& text, const std::string& left, const std::string& right) {
     const auto begin = text.find(left);
@@ -31,7 +38,7 @@ std::string between(const std::string& text, const std::string& left, const std:
 // The build tree may lie where only its owner gets in, and some tests run its programs as another
 // user.
 HintsMachine::HintsMachine()
-    : _systemBus(PrivateBus::underPolicy(VLM_BUS_POLICY)), _sessionBus(sessionBusOptions()) {
+    : _systemBus(systemBusOptions(_folder.path() / "services")), _sessionBus(sessionBusOptions()) {
     for (const char* program : {VLM_HINTS_SERVICE, VLM_HINTS_CALL})
         fs::copy_file(program, _folder.path() / fs::path(program).filename());
     fs::create_directory(commonFolder());
@@ -40,7 +47,7 @@ HintsMachine::HintsMachine()
 
 void HintsMachine::insertCard(const std::string& name) {
     _cards.add("Card", {identity("p256", name)});
-    if (!_daemon) return;
+    if (!_daemon && !_isDaemonStartable) return;
     const auto list = call({"op=1", "uid=-1"});
     _hash = between(list, "<", ">");
     _token = between(list, "\"pkcs11:", "\"");
@@ -64,6 +71,17 @@ std::vector<std::string> HintsMachine::daemonCommand(std::vector<std::string> mo
 void HintsMachine::startDaemon(std::vector<std::string> moreArguments) {
     _daemon = std::make_unique<Child>(daemonCommand(std::move(moreArguments)), options());
     waitForName(*_daemon, _systemBus, kDaemon);
+}
+
+void HintsMachine::makeDaemonStartable(const std::vector<std::string>& moreArguments) {
+    std::string command = "/usr/bin/env";
+    for (const auto& [name, value] : options().environment)
+        if (value) command += " " + name + "=" + *value;
+    for (const auto& argument : daemonCommand(moreArguments)) command += " " + argument;
+    _folder.write(
+        std::string("services/") + kDaemon + ".service",
+        std::string("[D-BUS Service]\nName=") + kDaemon + "\nUser=root\nExec=" + command + "\n");
+    _isDaemonStartable = true;
 }
 
 void HintsMachine::startAgent(std::optional<uid_t> user, std::vector<std::string> moreArguments) {

@@ -43,6 +43,11 @@ public:
     Child& agent() { return *_agent; }
     void stopDaemon() { _daemon.reset(); }
 
+    // From now on the bus starts the daemon when somebody asks for it.
+    void makeDaemonStartable(const std::vector<std::string>& moreArguments = {});
+    // Its connection to the bus, another one for each start; empty when it does not run.
+    std::string daemonConnection() const { return _systemBus.ownerOf(kDaemon); }
+
     // One exchange. As another user, when one is given; root only can do that.
     std::vector<std::string> callCommand(const std::string& name,
                                          const std::vector<std::string>& arguments) const;
@@ -77,6 +82,7 @@ private:
     SoftCards _cards;
     std::string _hash;
     std::string _token;
+    bool _isDaemonStartable = false;
     std::unique_ptr<Child> _daemon;
     std::unique_ptr<Child> _agent;
 };

@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -57,6 +58,26 @@ protected:
         ASSERT_TRUE(isRegistered());
     }
     bool isRegistered() { return machine.agent().waitForErrors("through this instance"); }
+    int timesRegistered() {
+        // Takes in what the instance has logged meanwhile.
+        machine.agent().waitForErrors("(never)", std::chrono::milliseconds(10));
+        const std::string line = "through this instance";
+        int times = 0;
+        for (auto at = machine.agent().errors().find(line); at != std::string::npos;
+             at = machine.agent().errors().find(line, at + 1))
+            ++times;
+        return times;
+    }
+    bool hasDaemonLeft() const {
+        return eventually([this] { return machine.daemonConnection().empty(); });
+    }
+    // Whether a daemon comes within a second that nobody has asked for.
+    bool appearsSoon() const {
+        const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(1);
+        while (std::chrono::steady_clock::now() < end)
+            if (!machine.daemonConnection().empty()) return true;
+        return false;
+    }
     // Its name on the system bus.
     std::string connectionOfTheAgent() {
         std::istringstream list(run({"busctl", "--address=" + machine.systemBus().address(), "list",
@@ -126,6 +147,48 @@ TEST_F(UserInstanceTest, RegistersAgainWhenTheDaemonStartsAgain) {
 
     EXPECT_TRUE(
         eventually([&] { return machine.callAgent(machine.login(), kNobodyUser) == "res 0\n"; }));
+}
+
+TEST_F(UserInstanceTest, RegistersAgainWhenSomebodyElseBringsTheDaemonBack) {
+    machine.makeDaemonStartable({"--idle-seconds", "0.3"});
+    machine.insertCard();
+    machine.startAgent(kNobodyUser, {"--pinentry", machine.answeringPinentry()});
+    ASSERT_TRUE(hasDaemonLeft());
+    const auto before = timesRegistered();
+
+    machine.call({"op=1", "uid=-1"});
+
+    EXPECT_TRUE(eventually([&] { return timesRegistered() == before + 1; }));
+}
+
+TEST_F(UserInstanceTest, AsksForTheRequestThatStartedTheDaemon) {
+    machine.makeDaemonStartable({"--idle-seconds", "0.3"});
+    machine.insertCard();
+    machine.startAgent(kNobodyUser, {"--pinentry", machine.answeringPinentry()});
+    ASSERT_TRUE(hasDaemonLeft());
+
+    EXPECT_EQ(machine.call(machine.login(), kNobodyUser), "res 0\n");
+}
+
+TEST_F(UserInstanceTest, AsksForTheForwardedRequestThatStartedTheDaemon) {
+    machine.makeDaemonStartable({"--idle-seconds", "0.3"});
+    machine.insertCard();
+    machine.startAgent(kNobodyUser, {"--pinentry", machine.answeringPinentry()});
+    ASSERT_TRUE(hasDaemonLeft());
+
+    EXPECT_EQ(machine.callAgent(machine.login(), kNobodyUser), "res 0\n");
+}
+
+TEST_F(UserInstanceTest, NeitherStartsTheDaemonNorKeepsIt) {
+    machine.makeDaemonStartable({"--idle-seconds", "0.3"});
+    machine.startAgent(kNobodyUser);
+    EXPECT_FALSE(appearsSoon());
+
+    machine.call({"op=1", "uid=-1"});
+    ASSERT_TRUE(isRegistered());
+
+    EXPECT_TRUE(hasDaemonLeft());
+    EXPECT_FALSE(appearsSoon());
 }
 
 TEST_F(UserInstanceTest, IsForgottenWhenItEnds) {

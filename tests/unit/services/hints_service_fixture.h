@@ -84,17 +84,18 @@ protected:
     fakes::FakePinPrompt prompt;
     fakes::FakePairingStore pairings;
     fakes::FakeCallerWatch callers;
+    Proofs proofs{[this] { return now; }};
     std::uint8_t lastRandom = 0;
     HintsService service{{
-        .login = {tokens, prompt,
-                  [](const Bytes&, const Bytes& hash, const Bytes& challenge,
-                     const Bytes& signature) {
-                      return signature == fakes::FakeTokens::signature(hash, challenge);
-                  },
-                  [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
+        .login = {
+            tokens, prompt,
+            [](const Bytes&, const Bytes& hash, const Bytes& challenge, const Bytes& signature) {
+                return signature == fakes::FakeTokens::signature(hash, challenge);
+            },
+            [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
         .pairings = pairings,
         .callers = callers,
-        .milliseconds = [this] { return now; },
+        .proofs = proofs,
         .now = [] { return kNow; },
     }};
 

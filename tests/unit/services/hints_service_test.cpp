@@ -310,7 +310,7 @@ TEST_F(HintsServiceTest, LetsGoOfAnswersThatComeAfterItIsGone) {
         HintsService shortLived{{.login = {cards, prompt, {}, {}},
                                  .pairings = pairings,
                                  .callers = callers,
-                                 .milliseconds = [] { return 0; },
+                                 .proofs = proofs,
                                  .now = [] { return kNow; }}};
         const auto count = [&](const platform::Message&) { ++replies; };
         shortLived.handle(root(), requestOf(1, {{"uid", signedNumber(-1)}}), count);

@@ -287,7 +287,7 @@ TEST_F(LoginTest, GivesTheCardNoPinWhenThereIsNothingToChallengeItWith) {
     HintsService poor{{.login = {cards, prompt, {}, [](std::size_t) { return std::nullopt; }},
                        .pairings = pairings,
                        .callers = callers,
-                       .milliseconds = [] { return 0; },
+                       .proofs = proofs,
                        .now = [] { return kNow; }}};
     platform::Message reply;
 

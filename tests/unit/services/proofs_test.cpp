@@ -7,6 +7,8 @@
 namespace vlm::service {
 namespace {
 
+using namespace std::chrono_literals;
+
 class ProofsTest : public testing::Test {
 protected:
     std::int64_t _now = 5'000;
@@ -46,6 +48,20 @@ TEST_F(ProofsTest, BeginAnewWhenTheKeyIsProvedAgain) {
     _now += 50'000;
 
     EXPECT_TRUE(_proofs.hold(1000, hashOf(1)));
+}
+
+TEST_F(ProofsTest, TellHowLongTheLastOfThemStillHolds) {
+    EXPECT_EQ(_proofs.timeLeft(), 0ms);
+    _proofs.remember(1000, hashOf(1));
+    _now += 10'000;
+    _proofs.remember(1000, hashOf(2));
+    _now += 20'000;
+    EXPECT_EQ(_proofs.timeLeft(), 40s);
+
+    _proofs.useUp(1000, hashOf(2));
+    EXPECT_EQ(_proofs.timeLeft(), 30s);
+    _now += 60'000;
+    EXPECT_EQ(_proofs.timeLeft(), 0ms);
 }
 
 }  // namespace
