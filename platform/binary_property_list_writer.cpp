@@ -33,7 +33,8 @@ public:
     // None when a text is not UTF-8, or the list takes more bytes than these.
     std::optional<Bytes> write(const PropertyList& value, std::size_t mostBytes) {
         _output.putBytes(kMagic.data(), kMagic.size());
-        if (!add(value)) return std::nullopt;
+        add(value);
+        if (!_isUtf8) return std::nullopt;
         putCollections();
         putEnd();
         _list.resize(used());
@@ -52,57 +53,54 @@ private:
 
     std::size_t used() const { return static_cast<std::size_t>(_output.place() - _list.data()); }
 
-    std::optional<Number> add(const PropertyList& value) {
+    Number add(const PropertyList& value) {
         return value.visit([this](const auto& held) { return add(held); });
     }
 
     // Numbers and dates each get an object: it is hardly larger than what shares it, and much
     // faster made than looked for.
     template <typename Scalar>
-    std::optional<Number> add(const Scalar& scalar) {
+    Number add(const Scalar& scalar) {
         const Number number = addObject();
         ScalarPutter{_output}(scalar);
         return number;
     }
 
-    std::optional<Number> add(const Bytes& bytes) {
+    Number add(const Bytes& bytes) {
         std::uint8_t* const begin = _output.place();
         ScalarPutter{_output}(bytes);
         return known(begin);
     }
 
     // A list may hold very many of these, and there are only two.
-    std::optional<Number> add(bool value) {
+    Number add(bool value) {
         auto& number = _booleans[value ? 1 : 0];
         if (!number) {
             number = addObject();
             ScalarPutter{_output}(value);
         }
-        return number;
+        return *number;
     }
 
-    std::optional<Number> add(const std::string& text) {
+    Number add(const std::string& text) {
         std::uint8_t* const begin = _output.place();
-        if (!putText(_output, text)) return std::nullopt;
+        if (!putText(_output, text)) _isUtf8 = false;
         return known(begin);
     }
 
-    std::optional<Number> add(const PropertyList::Array& array) {
+    Number add(const PropertyList::Array& array) {
         const Number self = addObject();
         std::size_t place = addCollection(self, Kind::Array, array.size());
-        for (const PropertyList& each : array)
-            if (!refer(place++, add(each))) return std::nullopt;
+        for (const PropertyList& each : array) _references[place++] = add(each);
         return self;
     }
 
     // All keys come before all values.
-    std::optional<Number> add(const PropertyList::Dictionary& dictionary) {
+    Number add(const PropertyList::Dictionary& dictionary) {
         const Number self = addObject();
         std::size_t place = addCollection(self, Kind::Dictionary, 2 * dictionary.size());
-        for (const auto& entry : dictionary)
-            if (!refer(place++, add(entry.first))) return std::nullopt;
-        for (const auto& entry : dictionary)
-            if (!refer(place++, add(entry.second))) return std::nullopt;
+        for (const auto& entry : dictionary) _references[place++] = add(entry.first);
+        for (const auto& entry : dictionary) _references[place++] = add(entry.second);
         return self;
     }
 
@@ -120,11 +118,6 @@ private:
         const std::size_t begin = _referencesUsed;
         _referencesUsed += size;
         return begin;
-    }
-
-    bool refer(std::size_t place, std::optional<Number> to) {
-        if (to) _references[place] = *to;
-        return to.has_value();
     }
 
     // The number of the text or the bytes that were written last; taken back when it was there
@@ -178,6 +171,7 @@ private:
     std::vector<Collection> _collections;
     std::vector<Number> _references;
     std::size_t _referencesUsed = 0;
+    bool _isUtf8 = true;  // every text so far
 };
 
 }  // namespace
