@@ -1,4 +1,5 @@
 #include "hints/hints_connection.h"
+#include "hints/hints_log.h"
 
 #include "hints_test.h"
 
