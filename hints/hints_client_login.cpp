@@ -3,6 +3,7 @@
 #include "hints/hints_client.h"
 #include "hints/hints_connection.h"
 #include "hints/hints_exchange.h"
+#include "hints/hints_log.h"
 #include "hints/status.h"
 #include "platform/platform.h"
 #include "platform/process_info.h"

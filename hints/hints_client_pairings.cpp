@@ -4,8 +4,8 @@
 #include <new>
 
 #include "hints/hints_client.h"
-#include "hints/hints_connection.h"
 #include "hints/hints_exchange.h"
+#include "hints/hints_log.h"
 #include "hints/status.h"
 #include "platform/token_framework.h"
 

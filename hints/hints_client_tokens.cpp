@@ -5,6 +5,7 @@
 #include "hints/hints_client.h"
 #include "hints/hints_connection.h"
 #include "hints/hints_exchange.h"
+#include "hints/hints_log.h"
 #include "platform/token_framework.h"
 
 using namespace vlm::hints;

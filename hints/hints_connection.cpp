@@ -4,10 +4,10 @@
 #include <string>
 #include <utility>
 
+#include "hints/hints_log.h"
 #include "platform/console_sessions.h"
 #include "platform/platform.h"
 #include "platform/process_info.h"
-#include "platform/token_framework.h"
 
 namespace vlm::hints {
 
@@ -82,11 +82,6 @@ bool setStringToMsgObject(platform::Message* message, std::string_view key, cons
     utf8.resize(utf8.find_last_not_of('\0') + 1);
     message->set(key, std::move(utf8));
     return true;
-}
-
-const platform::Log& log() {
-    static const platform::Log handle(platform::kTokenFramework, "ZEM");
-    return handle;
 }
 
 }  // namespace vlm::hints

@@ -1,6 +1,6 @@
 // How the hints service is reached: whom to talk to, and how text gets into a message.
 //
-// Threads:  any; there is no state but the log handle.
+// Threads:  any; there is no state.
 // Blocking: no; a connection is only made ready.
 // Errors:   a service that is not there shows in the exchange.
 // In tests: tests/unit/hints/hints_connection_test.cpp
@@ -14,7 +14,6 @@
 #include "platform/message.h"
 #include "platform/named_service_ipc.h"
 #include "platform/string.h"
-#include "platform/system_log.h"
 #include "platform/types.h"
 
 namespace vlm::hints {
@@ -37,8 +36,5 @@ std::unique_ptr<platform::Connection> setupConnection(platform::Connection::Even
 // converted.
 bool setStringToMsgObject(platform::Message* message, std::string_view key,
                           const platform::String& string);
-
-// The handle that all exported functions log through.
-const platform::Log& log();
 
 }  // namespace vlm::hints

@@ -4,6 +4,7 @@
 #include <string>
 
 #include "hints/hints_connection.h"
+#include "hints/hints_log.h"
 #include "hints/status.h"
 #include "platform/token_framework.h"
 

@@ -26,7 +26,9 @@ inline std::size_t countBytes(std::size_t count) {
     return count < kLongCount ? 1 : 1 + 1 + widthOf(count);
 }
 
-// Writes into memory that is known to be large enough.
+// Writes into memory that is known to be large enough. Behind a number it may overwrite up to seven
+// bytes that nothing was written to yet; the trailer, which comes last and is as long as it says,
+// leaves room for that.
 class Cursor {
 public:
     explicit Cursor(std::uint8_t* place) : _place(place) {}
@@ -34,10 +36,12 @@ public:
     std::uint8_t* place() const { return _place; }
     void goBackTo(std::uint8_t* place) { _place = place; }
 
-    // Big-endian.
+    // Big-endian, of at least one byte.
     void putNumber(std::uint64_t number, std::size_t width) {
-        for (std::size_t byte = width; byte-- > 0; number >>= 8U)
-            _place[byte] = static_cast<std::uint8_t>(number);
+        number <<= 8 * (sizeof number - width);
+        if constexpr (std::endian::native == std::endian::little)
+            number = __builtin_bswap64(number);
+        std::memcpy(_place, &number, sizeof number);
         _place += width;
     }
 

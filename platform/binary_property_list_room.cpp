@@ -4,6 +4,8 @@
 
 #include "platform/binary_property_list_output.h"
 #include "platform/property_list_reading.h"
+#include "platform/secret_hash.h"
+#include "platform/seen_set.h"
 #include "platform/utf.h"
 
 namespace vlm::platform::binary_format {
@@ -13,11 +15,14 @@ namespace {
 // Each function answers false as soon as a limit is passed.
 class Counter {
 public:
-    explicit Counter(const PropertyListLimits& limits) : _limits(limits), _budget(limits) {}
+    explicit Counter(const PropertyListLimits& limits) : _limits(limits), _budget(limits) {
+        constexpr std::size_t kOfASmallList = 64;
+        _room.hashes.reserve(kOfASmallList);
+    }
 
     bool addTop(const PropertyList& value) { return _budget.takeObjects(1) && add(value, 0); }
 
-    const Room& room() const { return _room; }
+    Room room() && { return std::move(_room); }
 
 private:
     bool add(const PropertyList& value, std::size_t depth) {
@@ -35,10 +40,12 @@ private:
     // In UTF-16 a character of one byte takes two, of two or three bytes two, of four bytes four.
     bool add(const std::string& text, std::size_t) {
         const std::size_t most = isAscii(text) ? text.size() : 2 * text.size();
-        return addSharable(text.size(), most);
+        return addSharable(_hashOf(text), text.size(), most);
     }
 
-    bool add(const Bytes& bytes, std::size_t) { return addSharable(bytes.size(), bytes.size()); }
+    bool add(const Bytes& bytes, std::size_t) {
+        return addSharable(_hashOf(bytes), bytes.size(), bytes.size());
+    }
 
     bool add(const PropertyList::Array& array, std::size_t depth) {
         return addCollection(array.size(), depth) &&
@@ -48,9 +55,10 @@ private:
 
     bool add(const PropertyList::Dictionary& dictionary, std::size_t depth) {
         return addCollection(2 * dictionary.size(), depth) &&
-               std::ranges::all_of(dictionary, [&](const auto& entry) {
-                   return add(entry.first, depth) && add(entry.second, depth + 1);
-               });
+               std::ranges::all_of(dictionary,
+                                   [&](const auto& entry) { return add(entry.first, depth); }) &&
+               std::ranges::all_of(dictionary,
+                                   [&](const auto& entry) { return add(entry.second, depth + 1); });
     }
 
     bool addScalar(std::size_t bytes) {
@@ -59,8 +67,8 @@ private:
         return true;
     }
 
-    bool addSharable(std::size_t held, std::size_t written) {
-        ++_room.sharable;
+    bool addSharable(std::uint32_t hash, std::size_t held, std::size_t written) {
+        _room.hashes.push_back(hash);
         return _budget.takeBytes(held) && addScalar(countBytes(held) + written);
     }
 
@@ -73,6 +81,7 @@ private:
     }
 
     const PropertyListLimits& _limits;
+    const SecretHash _hashOf;
     PropertyListBudget _budget;
     Room _room;
 };
@@ -84,10 +93,15 @@ std::size_t Room::bytes() const {
     return table + objects() * widthOf(table) + kTrailerSize;
 }
 
+bool Room::isNumberable() const {
+    constexpr std::size_t kMost = 0xFFFFFFFF;
+    return objects() <= SeenSet::kMostPieces && bytes() <= kMost;
+}
+
 std::optional<Room> roomFor(const PropertyList& value, const PropertyListLimits& limits) {
     Counter counter(limits);
     if (!counter.addTop(value)) return std::nullopt;
-    return counter.room();
+    return std::move(counter).room();
 }
 
 }  // namespace vlm::platform::binary_format

@@ -4,8 +4,9 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <optional>
-#include <string>
+#include <vector>
 
 #include "platform/binary_property_list.h"
 #include "platform/property_list.h"
@@ -14,13 +15,14 @@ namespace vlm::platform::binary_format {
 
 struct Room {
     std::size_t scalars = 0;
-    std::size_t sharable = 0;  // of them, texts and bytes
     std::size_t collections = 0;
     std::size_t references = 0;
     std::size_t contents = 0;  // bytes of scalars, and of the collections' markers and counts
+    std::vector<std::uint32_t> hashes = {};  // of texts and bytes, in the order of writing
 
     std::size_t objects() const { return scalars + collections; }
     std::size_t bytes() const;  // of the whole list
+    bool isNumberable() const;  // whether 32 bits hold every object's number and offset
 };
 
 // None for a value that is not within the limits.

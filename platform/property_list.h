@@ -7,7 +7,8 @@
 // Threads:  values; distinct values are independent.
 // Errors:   reading answers none for anything that is not a well-formed list within the limits:
 //           no offset, count or length of the input is trusted. Writing answers none for a value
-//           that the format cannot hold (text that is not UTF-8) or that exceeds the limits.
+//           that the format cannot hold (text that is not UTF-8), that exceeds the limits, or whose
+//           binary list could take more than 4 GiB.
 // Choice:   a key that comes more than once has its last value, in every format.
 // Source:   the binary property-list format 1.0 ("bplist00": object table, offset table, trailer);
 //           XML 1.0 with the elements plist, dict, key, array, string, integer, real, true, false,

@@ -1,8 +1,7 @@
 #include "platform/property_list_reading.h"
 
-#include <span>
-
 #include "platform/harmless_text.h"
+#include "platform/secret_hash.h"
 #include "platform/seen_set.h"
 #include "platform/text.h"
 
@@ -28,13 +27,13 @@ PropertyList dictionaryOf(PropertyListEntries entries) {
 
     PropertyListEntries distinct;
     distinct.reserve(entries.size());
+    const SecretHash hashOf;
     SeenSet seen(entries.size());
     for (auto& entry : entries) {
         const std::string& key = entry.first;
-        const std::span bytes(reinterpret_cast<const std::uint8_t*>(key.data()), key.size());
         const auto next = static_cast<std::uint32_t>(distinct.size());
         const auto first = seen.findOrAdd(
-            bytes, next, [&](std::uint32_t other) { return distinct[other].first == key; });
+            hashOf(key), next, [&](std::uint32_t other) { return distinct[other].first == key; });
         if (first == next)
             distinct.push_back(std::move(entry));
         else

@@ -77,11 +77,18 @@ Utf8Character encodeUtf8(char32_t character) {
 bool isAscii(std::string_view text) {
     std::uint64_t all = 0;
     std::uint64_t eight = 0;
-    for (; text.size() >= sizeof eight; text.remove_prefix(sizeof eight)) {
-        std::memcpy(&eight, text.data(), sizeof eight);
+    if (text.size() < sizeof eight) {
+        for (const char byte : text) all |= static_cast<unsigned char>(byte);
+    } else {
+        // The last eight may overlap the ones before them.
+        const char* const last = text.data() + text.size() - sizeof eight;
+        for (const char* place = text.data(); place < last; place += sizeof eight) {
+            std::memcpy(&eight, place, sizeof eight);
+            all |= eight;
+        }
+        std::memcpy(&eight, last, sizeof eight);
         all |= eight;
     }
-    for (const char byte : text) all |= static_cast<unsigned char>(byte);
     return (all & 0x8080808080808080U) == 0;
 }
 

@@ -4,7 +4,7 @@
 #include <fstream>
 #include <system_error>
 
-#include "hints/hints_connection.h"
+#include "hints/hints_log.h"
 #include "platform/types.h"
 
 namespace vlm {

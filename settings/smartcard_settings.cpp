@@ -1,7 +1,7 @@
 #include "settings/smartcard_settings.h"
 
 #include "hints/hints_client.h"
-#include "hints/hints_connection.h"
+#include "hints/hints_log.h"
 #include "settings/smartcard_configuration.h"
 #include "settings/smartcard_settings_worker.h"
 

@@ -5,7 +5,7 @@
 #include <limits>
 #include <string>
 
-#include "hints/hints_connection.h"
+#include "hints/hints_log.h"
 #include "platform/platform.h"
 #include "platform/preferences.h"
 #include "settings/known_settings.h"

@@ -12,6 +12,7 @@
 #include <iterator>
 #include <utility>
 
+#include "platform/linux/open_or_make_folder.h"
 #include "platform/linux/user_folders.h"
 
 namespace vlm::platform {
@@ -32,16 +33,7 @@ bool isTrusted(const FileDescriptor& opened, const PreferencesFolder& folder) {
 
 FileDescriptor openOrMake(const FileDescriptor& parent, const std::string& name,
                           const PreferencesFolder& folder) {
-    const bool made = mkdirat(parent.get(), name.c_str(), folder.folderMode) == 0;
-    if (!made && errno != EEXIST) return {};
-    FileDescriptor opened(openat(parent.get(), name.c_str(), kPassThrough | O_NOFOLLOW));
-    struct stat status {};
-    // A strict mask would hide the machine's preferences from its users.
-    if (made && opened && fstat(opened.get(), &status) == 0 &&
-        (status.st_mode & folder.folderMode) != folder.folderMode &&
-        fchmodat(parent.get(), name.c_str(), folder.folderMode, 0) != 0)
-        return {};
-    return opened;
+    return openOrMakeFolder(parent, name, folder.folderMode, kPassThrough | O_NOFOLLOW);
 }
 
 // The base is made as well, when the folder that it belongs in is there.
@@ -56,17 +48,6 @@ FileDescriptor openBase(const PreferencesFolder& folder) {
 
 PreferencesFolder machineFolder(const char* name) { return {"/etc", {"vlm", name}}; }
 
-std::optional<std::string> configurationHome() {
-    if (auto configured = environmentFolder("XDG_CONFIG_HOME")) {
-        while (configured->size() > 1 && configured->back() == '/') configured->pop_back();
-        return configured;
-    }
-    auto home = environmentFolder("HOME");
-    if (!home) home = accountHomeFolder();
-    if (!home) return std::nullopt;
-    return *home + "/.config";
-}
-
 std::string thisHost() {
     std::array<char, HOST_NAME_MAX + 1> name{};
     gethostname(name.data(), name.size() - 1);
@@ -76,7 +57,8 @@ std::string thisHost() {
 }
 
 std::optional<PreferencesFolder> currentUserFolder() {
-    auto home = configurationHome();
+    auto home = configurationHome(UserPlaces::ofThisEnvironment());
+    if (!home) home = configurationHome(UserPlaces::ofThisProcess());
     if (!home) return std::nullopt;
     return PreferencesFolder{
         std::move(*home), {"vlm", "hosts", thisHost()}, geteuid(), S_IWOTH, 0700, 0600};

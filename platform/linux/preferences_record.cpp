@@ -1,13 +1,13 @@
 #include "platform/linux/preferences_record.h"
 
 #include <fcntl.h>
-#include <unistd.h>
 
 #include <cerrno>
 #include <functional>
 #include <system_error>
 #include <utility>
 
+#include "platform/linux/read_to_end.h"
 #include "platform/text.h"
 
 namespace vlm::platform {
@@ -44,23 +44,6 @@ void judge(PreferencesRecord& record, const struct stat& status, const Preferenc
     } else {
         record.state = State::Good;
     }
-}
-
-// The content up to one byte more than a record may have; none when reading fails.
-std::optional<Bytes> contentOf(int file, std::size_t expected) {
-    Bytes content(expected + 1);
-    std::size_t size = 0;
-    while (true) {
-        const ssize_t count = read(file, content.data() + size, content.size() - size);
-        if (count < 0 && errno == EINTR) continue;
-        if (count < 0) return std::nullopt;
-        if (count == 0) break;
-        size += static_cast<std::size_t>(count);
-        if (size > kLargestRecord) break;
-        if (size == content.size()) content.resize(kLargestRecord + 1);  // it grew
-    }
-    content.resize(size);
-    return content;
 }
 
 void parse(PreferencesRecord& record, const Bytes& content) {
@@ -127,7 +110,8 @@ PreferencesRecord readRecord(const FileDescriptor& folder, const std::string& fi
     PreferencesRecord record;
     judge(record, status, rules);
     if (record.state == State::Good) {
-        const auto content = contentOf(file.get(), static_cast<std::size_t>(status.st_size));
+        const auto content =
+            readToEnd(file.get(), kLargestRecord, static_cast<std::size_t>(status.st_size));
         if (!content) return withoutFile();
         parse(record, *content);
     }

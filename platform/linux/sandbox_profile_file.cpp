@@ -5,13 +5,13 @@
 
 #include <cerrno>
 #include <filesystem>
-#include <memory>
 #include <optional>
 #include <string>
 #include <system_error>
 #include <utility>
 
 #include "platform/linux/file_descriptor.h"
+#include "platform/linux/read_to_end.h"
 #include "platform/text.h"
 
 namespace vlm::platform {
@@ -35,26 +35,17 @@ std::optional<std::string> readSmallFile(const std::string& path, std::string& e
         error = "not a plain file";
         return std::nullopt;
     }
-    // One byte more than allowed tells a file that is too large from one that just fits. The room
-    // is not cleared: a profile needs a page or two of it.
-    constexpr std::size_t kRoom = kLargestProfile + 1;
-    const auto content = std::make_unique_for_overwrite<char[]>(kRoom);
-    std::size_t size = 0;
-    while (size < kRoom) {
-        const ssize_t count = read(file.get(), content.get() + size, kRoom - size);
-        if (count == 0) break;
-        if (count < 0 && errno == EINTR) continue;
-        if (count < 0) {
-            error = systemMessage();
-            return std::nullopt;
-        }
-        size += static_cast<std::size_t>(count);
+    const auto content =
+        readToEnd(file.get(), kLargestProfile, static_cast<std::size_t>(status.st_size));
+    if (!content) {
+        error = systemMessage();
+        return std::nullopt;
     }
-    if (size > kLargestProfile) {
+    if (content->size() > kLargestProfile) {
         error = text("larger than {} bytes", kLargestProfile);
         return std::nullopt;
     }
-    return std::string(content.get(), size);
+    return std::string(content->begin(), content->end());
 }
 
 }  // namespace

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "platform/linux/file_descriptor.h"
+#include "platform/linux/open_or_make_folder.h"
 
 namespace vlm::platform {
 
@@ -28,12 +29,9 @@ struct Place {
     std::vector<std::string> exclusive;  // ours alone
 };
 
-// Opens the folder below the parent, made when it is missing. Only folders of the user's own are
-// ever opened here, so nobody else's folder gets a new one.
+// Only folders of the user's own are ever opened here, so nobody else's folder gets a new one.
 FileDescriptor openOrMake(const FileDescriptor& parent, const std::string& name, int flags) {
-    if (mkdirat(parent.get(), name.c_str(), kPrivate) != 0 && errno != EEXIST) return {};
-    return FileDescriptor(
-        openat(parent.get(), name.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC | flags));
+    return openOrMakeFolder(parent, name, kPrivate, O_RDONLY | O_DIRECTORY | O_CLOEXEC | flags);
 }
 
 bool isOwned(const struct stat& folder, mode_t forbidden) {
@@ -95,11 +93,16 @@ std::vector<Place> cachePlaces(const UserPlaces& from, const std::vector<std::st
 Place configuredPlace(std::string folder) {
     while (folder.size() > 1 && folder.back() == '/') folder.pop_back();
     const auto slash = folder.rfind('/');
-    if (slash == 0 || access(folder.c_str(), F_OK) == 0) return {folder, {kOwnFolder}, {}};
-    return {folder.substr(0, slash), {folder.substr(slash + 1), kOwnFolder}, {}};
+    if (slash == 0 || access(folder.c_str(), F_OK) == 0) return {folder, {}, {}};
+    return {folder.substr(0, slash), {folder.substr(slash + 1)}, {}};
 }
 
-}  // namespace
+std::optional<Place> configurationPlace(const UserPlaces& from) {
+    if (from.configurationHome) return configuredPlace(*from.configurationHome);
+    const auto& home = from.home ? from.home : from.accountHome;
+    if (!home) return std::nullopt;
+    return Place{*home, {".config"}, {}};
+}
 
 std::optional<std::string> environmentFolder(const char* name) {
     // secure_getenv: whoever starts a set-user-id program chooses no folder of its user.
@@ -117,6 +120,8 @@ std::optional<std::string> accountHomeFolder() {
         return std::nullopt;
     return std::string(found->pw_dir);
 }
+
+}  // namespace
 
 UserPlaces UserPlaces::ofThisEnvironment() {
     return {environmentFolder("XDG_RUNTIME_DIR"), environmentFolder("XDG_CACHE_HOME"),
@@ -139,11 +144,18 @@ FolderAnswer userCacheFolder(const UserPlaces& from) {
     return firstUsable(cachePlaces(from, {kOwnFolder}));
 }
 
+std::optional<std::string> configurationHome(const UserPlaces& from) {
+    auto place = configurationPlace(from);
+    if (!place) return std::nullopt;
+    for (const auto& name : place->shared) place->base.append("/").append(name);
+    return std::move(place->base);
+}
+
 FolderAnswer userConfigurationFolder(const UserPlaces& from) {
-    if (from.configurationHome) return openPlace(configuredPlace(*from.configurationHome));
-    const auto& home = from.home ? from.home : from.accountHome;
-    if (!home) return {{}, ENOENT};
-    return openPlace({*home, {".config", kOwnFolder}, {}});
+    auto place = configurationPlace(from);
+    if (!place) return {{}, ENOENT};
+    place->shared.emplace_back(kOwnFolder);
+    return openPlace(*place);
 }
 
 }  // namespace vlm::platform

@@ -15,14 +15,8 @@
 
 namespace vlm::platform {
 
-// The folder that the variable names; none when it names no absolute path, or when the program runs
-// with raised privileges.
-std::optional<std::string> environmentFolder(const char* name);
-
-// The home folder of the effective user's account.
-std::optional<std::string> accountHomeFolder();
-
-// The places that the environment and the accounts name, none for what they leave out.
+// The places that the environment and the accounts name, none for what they leave out. A variable
+// counts when it names an absolute path, and the program does not run with raised privileges.
 struct UserPlaces {
     std::optional<std::string> runtimeFolder;           // XDG_RUNTIME_DIR
     std::optional<std::string> cacheHome;               // XDG_CACHE_HOME
@@ -37,8 +31,12 @@ struct UserPlaces {
 FolderAnswer userTemporaryFolder(const UserPlaces& places);
 FolderAnswer userCacheFolder(const UserPlaces& places);
 
-// The folder of the user's preferences. There is one place for it only, since what is written in
-// one must not be looked for in another. It may be a link, and others may read it.
+// The folder that the user's preferences lie in, whether it is there or not; none for a user
+// without a home.
+std::optional<std::string> configurationHome(const UserPlaces& places);
+
+// Our folder in that one, for the user's preferences. There is one place for it only, since what is
+// written in one must not be looked for in another. It may be a link, and others may read it.
 FolderAnswer userConfigurationFolder(const UserPlaces& places);
 
 }  // namespace vlm::platform

@@ -3,7 +3,6 @@
 #include "hints/hints_client.h"
 #include "platform/text.h"
 #include "services/vlmctl/known_key.h"
-#include "services/vlmctl/read_file.h"
 #include "settings/smartcard_configuration.h"
 #include "settings/smartcard_settings.h"
 
@@ -30,11 +29,8 @@ std::string nameOf(SmartcardSettingOrigin origin) {
 }
 
 bool configurationMapsUsers() {
-    const auto content = readFile(kSmartcardConfiguration, kLargestConfiguration);
-    const auto list = content.bytes
-                          ? platform::readPropertyList(*content.bytes, kConfigurationLimits)
-                          : std::nullopt;
-    return list && list->dictionary() && list->dictionary()->contains(kAttributeMapping);
+    const auto configuration = copySmartCardConfiguration();
+    return configuration && configuration->contains(kAttributeMapping);
 }
 
 // Only a machine that enforces cards and lets some in without asks who the user is.

@@ -1,5 +1,6 @@
 #include "hints/hints_connection.h"
 
+#include "hints/hints_log.h"
 #include "hints_test.h"
 
 namespace vlm::hints {

@@ -73,10 +73,19 @@ TEST(PropertyListRoomTest, CountsWhatThereIs) {
     const auto room = roomFor(Dictionary{{"a", Array{1, "b", Bytes{1}}}, {"c", true}});
 
     EXPECT_EQ(room.scalars, 6u);
-    EXPECT_EQ(room.sharable, 4u);
+    EXPECT_EQ(room.hashes.size(), 4u);
     EXPECT_EQ(room.collections, 2u);
     EXPECT_EQ(room.references, 7u);
     EXPECT_EQ(room.objects(), 8u);
+}
+
+TEST(PropertyListRoomTest, IsNumberableWhile32BitsHoldEveryNumberAndOffset) {
+    const std::size_t most = 0xFFFFFFFF;
+
+    EXPECT_TRUE((binary_format::Room{.scalars = 1}.isNumberable()));
+    EXPECT_TRUE((binary_format::Room{.contents = most / 2}.isNumberable()));
+    EXPECT_FALSE((binary_format::Room{.contents = most}.isNumberable()));
+    EXPECT_FALSE((binary_format::Room{.scalars = most}.isNumberable()));
 }
 
 TEST(PropertyListRoomTest, IsNotGivenBeyondTheLimits) {

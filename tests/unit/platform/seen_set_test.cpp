@@ -5,6 +5,8 @@
 #include <algorithm>
 #include <string>
 
+#include "platform/secret_hash.h"
+
 namespace vlm::platform {
 namespace {
 
@@ -14,9 +16,9 @@ protected:
     // The number of the piece that is found to be the same; a new one's own.
     std::uint32_t findOrAdd(const std::string& piece) {
         const auto next = static_cast<std::uint32_t>(_pieces.size());
-        const std::vector<std::uint8_t> bytes(piece.begin(), piece.end());
-        const std::uint32_t found = _set.findOrAdd(
-            bytes, next, [&](std::uint32_t number) { return _pieces.at(number) == piece; });
+        const std::uint32_t found = _set.findOrAdd(_hashOf(piece), next, [&](std::uint32_t number) {
+            return _pieces.at(number) == piece;
+        });
         if (found == next) _pieces.push_back(piece);
         return found;
     }
@@ -28,6 +30,7 @@ protected:
             EXPECT_EQ(findOrAdd(pieces[number]), number) << "again, size " << pieces[number].size();
     }
 
+    SecretHash _hashOf;
     SeenSet _set{0};
     std::vector<std::string> _pieces;
 };
@@ -86,7 +89,7 @@ TEST_F(SeenSetTest, ComparesHardlyAnyPieceThatDiffers) {
         std::vector<std::uint8_t> bytes(number % 40 + 3);
         for (std::size_t byte = 0; byte < 3; ++byte)
             bytes[byte] = static_cast<std::uint8_t>(number >> (8 * byte));
-        _set.findOrAdd(bytes, number, [&](std::uint32_t) {
+        _set.findOrAdd(_hashOf(bytes), number, [&](std::uint32_t) {
             ++compared;
             return false;
         });
