@@ -1,6 +1,9 @@
 """The tool's switch for the dialog, the request for it, and the administrator's settings."""
 
+import json
+
 from machine.checks import check
+from machine.listing import only_identity, pair
 
 ENABLED = "SmartCard Pairing dialog is enabled.\n"
 DISABLED = "SmartCard Pairing dialog is disabled.\n"
@@ -86,11 +89,43 @@ def the_request_for_the_dialog_ends_with_255_and_reaches_nobody_yet(lab):
     check.assertIn("org.vlm.vlmbind.force-bind-ui", lab.journal("SUBSYSTEM=org.vlm.token"))
 
 
+def root_without_a_session_bus_asks_for_the_dialog_in_vain(lab):
+    asked = lab.root("vlmbind", "-f")
+
+    check.assertEqual((asked.status, asked.output), (255, ""))
+    check.assertRegex(lab.journal("SUBSYSTEM=org.vlm.token"), "(?i)session bus")
+
+
+def vlmctl_tells_each_what_he_may_know(lab):
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "pin 123456")
+    check.assertEqual(pair(lab, "bob", hash_).status, 0)
+
+    pairings = json.loads(lab.root("vlmctl", "--json", "pairings").output)
+    check.assertEqual([each["account"] for each in pairings["pairings"]], ["bob"])
+    check.assertIn(hash_, lab.user("bob", "vlmctl", "pairings").output)
+    check.assertNotIn(hash_, lab.user("alice", "vlmctl", "pairings").output)
+    for listed in (lab.root("vlmctl", "tokens"), lab.user("alice", "vlmctl", "tokens")):
+        check.assertIn("Alice Archer", listed.output)
+
+
+def vlmctl_says_what_is_wrong_in_a_managed_file(lab):
+    _manage(lab)
+    file = "/etc/vlm/managed/org.vlm.smartcard.plist"
+    check.assertEqual(lab.user("alice", "vlmctl", "check", file).status, 0)
+
+    lab.root("sed", "-i", "s|</dict>||", file)
+
+    wrong = lab.user("alice", "vlmctl", "check", file)
+    check.assertNotEqual(wrong.status, 0)
+    check.assertRegex(wrong.output + wrong.errors, r":\d+:\d+: ")
+    check.assertRegex(lab.root("vlmctl", "settings").output, r"oneCardPerUser +0 +default\n")
+
+
 def the_one_card_rule_of_management_is_obeyed(lab):
     _manage(lab)
     lab.answer("pinentry", "pin 123456")
-    from machine.listing import only_identity, pair
-
     lab.insert("rsa")
     check.assertEqual(pair(lab, "alice", only_identity(lab, "Alice Archer")).status, 0)
     lab.insert("second", 2)
