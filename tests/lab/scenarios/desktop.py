@@ -81,3 +81,7 @@ def a_window_is_seen_on_the_screen_and_by_assistive_programs(lab):
 
     check.assertIn("password text", lab.windows())
     check.assertNotEqual(lab.screenshot(), empty)
+
+    lab.windows("type", "pw-alice")
+    lab.windows("press", "Unlock")
+    lab.wait_until("the window is gone", lambda: "Unlock" not in lab.windows())
