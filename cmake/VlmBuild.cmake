@@ -36,7 +36,8 @@ set(VLM_SANITIZERS "" CACHE STRING "Sanitizers to build with, as -fsanitize= tak
 
 find_program(CCACHE ccache)
 if(CCACHE)
-    set(CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE}")
+    # Else it would not touch what uses precompiled headers.
+    set(CMAKE_CXX_COMPILER_LAUNCHER env CCACHE_SLOPPINESS=pch_defines,time_macros "${CCACHE}")
     set(CMAKE_C_COMPILER_LAUNCHER "${CCACHE}")
 endif()
 
