@@ -14,6 +14,13 @@ def only_identity(lab, name: str) -> str:
     return lab.wait_until(f"{name} is listed", lambda: identities(lab).get(name))
 
 
+def present(lab, card: str, name: str, reader: int = 1) -> str:
+    """Inserts a card whose holder will give the right PIN; its identity's public-key hash."""
+    lab.insert(card, reader)
+    lab.answer("pinentry", "pin 123456")
+    return only_identity(lab, name)
+
+
 def pair(lab, account: str, hash_: str):
     return lab.root("vlmbind", "-p", "-v", "-u", account, "-h", hash_)
 

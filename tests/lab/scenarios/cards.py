@@ -4,7 +4,7 @@ import subprocess
 import time
 
 from machine.checks import check
-from machine.listing import identities, only_identity, pair
+from machine.listing import identities, only_identity, pair, present
 
 
 def two_cards_in_two_readers_are_both_listed(lab):
@@ -27,9 +27,7 @@ def two_cards_in_two_readers_are_both_listed(lab):
 
 def the_right_one_of_two_cards_is_asked_for_its_pin(lab):
     lab.insert("rsa", 1)
-    lab.insert("second", 2)
-    hash_ = only_identity(lab, "Carol Cooper")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "second", "Carol Cooper", 2)
 
     check.assertEqual(pair(lab, "carol", hash_).status, 0)
 
@@ -73,9 +71,7 @@ def a_card_pulled_while_its_pin_is_asked_for_pairs_nobody(lab):
 
 
 def a_card_that_breaks_in_the_middle_of_its_signature_pairs_nobody(lab):
-    lab.insert("breaking")
-    hash_ = only_identity(lab, "Henry Hunter")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "breaking", "Henry Hunter")
 
     _refused_without_a_trace(lab, _start_pairing(lab, "alice", hash_), hash_)
 
@@ -85,9 +81,7 @@ def a_card_that_breaks_in_the_middle_of_its_signature_pairs_nobody(lab):
 
 
 def a_slow_card_keeps_nobody_else_waiting(lab):
-    lab.insert("rsa", 1)
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer", 1)
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
     # From here on the module is busy with a card that takes seconds to read.

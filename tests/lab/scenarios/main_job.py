@@ -1,13 +1,11 @@
 """The main job from the shell, with a real card: list, pair, list, unpair."""
 
 from machine.checks import check
-from machine.listing import identities, only_identity, pair, unpair
+from machine.listing import identities, only_identity, pair, present, unpair
 
 
 def root_lists_pairs_lists_and_unpairs(lab):
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
 
     paired = pair(lab, "alice", hash_)
     check.assertEqual(paired.status, 0, paired)
@@ -33,9 +31,7 @@ def root_lists_pairs_lists_and_unpairs(lab):
 
 
 def an_elliptic_curve_card_is_paired(lab):
-    lab.insert("ec")
-    hash_ = only_identity(lab, "Bob Baker")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "ec", "Bob Baker")
 
     paired = pair(lab, "bob", hash_)
 
@@ -44,9 +40,7 @@ def an_elliptic_curve_card_is_paired(lab):
 
 
 def a_card_that_can_only_sign_is_paired(lab):
-    lab.insert("no-wrap-key")
-    hash_ = only_identity(lab, "Dan Draper")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "no-wrap-key", "Dan Draper")
 
     paired = pair(lab, "alice", hash_)
 
@@ -92,9 +86,7 @@ def an_ordinary_user_may_list_and_not_pair(lab):
 
 
 def an_ordinary_user_does_not_unpair(lab):
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
     for user in ("alice", "bob"):
@@ -105,9 +97,7 @@ def an_ordinary_user_does_not_unpair(lab):
 
 
 def the_user_at_the_console_is_asked_for_the_pin(lab):
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
 
     pair(lab, "bob", hash_)
 
@@ -142,9 +132,7 @@ def a_person_who_dismisses_the_question_costs_no_try(lab):
 
 def a_blocked_card_says_so_and_asks_nobody(lab):
     lab.card_ctl("set-tries", "rsa", "0")
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
 
     refused = pair(lab, "alice", hash_)
 

@@ -3,7 +3,7 @@
 import subprocess
 
 from machine.checks import check
-from machine.listing import identities, only_identity, pair
+from machine.listing import identities, only_identity, pair, present
 
 SERVICE = "vlmhintsd.service"
 
@@ -18,9 +18,7 @@ def nothing_starts_it_but_a_request(lab):
 
 def it_leaves_when_idle_and_comes_back_with_its_pairings(lab):
     _leave_soon(lab)
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
     lab.wait_until("it left", lambda: not _runs(lab))
@@ -31,9 +29,7 @@ def it_leaves_when_idle_and_comes_back_with_its_pairings(lab):
 
 
 def a_pin_is_asked_for_by_a_service_that_was_just_started(lab):
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
     lab.root("systemctl", "stop", SERVICE)
 
     paired = pair(lab, "alice", hash_)
@@ -43,9 +39,7 @@ def a_pin_is_asked_for_by_a_service_that_was_just_started(lab):
 
 
 def a_restart_forgets_nothing(lab):
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
     lab.root("systemctl", "restart", SERVICE)
@@ -83,9 +77,7 @@ def a_module_that_crashes_takes_no_service_with_it(lab):
 
 
 def its_database_is_roots_alone(lab):
-    lab.insert("rsa")
-    lab.answer("pinentry", "pin 123456")
-    pair(lab, "alice", only_identity(lab, "Alice Archer"))
+    pair(lab, "alice", present(lab, "rsa", "Alice Archer"))
 
     database = "/var/lib/vlm/hints.sqlite3"
     check.assertEqual(lab.root("stat", "-c", "%U %a", database).output, "root 600\n")

@@ -3,7 +3,7 @@
 import json
 
 from machine.checks import check
-from machine.listing import only_identity, pair
+from machine.listing import pair, present
 
 ENABLED = "SmartCard Pairing dialog is enabled.\n"
 DISABLED = "SmartCard Pairing dialog is disabled.\n"
@@ -97,9 +97,7 @@ def root_without_a_session_bus_asks_for_the_dialog_in_vain(lab):
 
 
 def vlmctl_tells_each_what_he_may_know(lab):
-    lab.insert("rsa")
-    hash_ = only_identity(lab, "Alice Archer")
-    lab.answer("pinentry", "pin 123456")
+    hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "bob", hash_).status, 0)
 
     pairings = json.loads(lab.root("vlmctl", "--json", "pairings").output)
@@ -125,11 +123,9 @@ def vlmctl_says_what_is_wrong_in_a_managed_file(lab):
 
 def the_one_card_rule_of_management_is_obeyed(lab):
     _manage(lab)
-    lab.answer("pinentry", "pin 123456")
-    lab.insert("rsa")
-    check.assertEqual(pair(lab, "alice", only_identity(lab, "Alice Archer")).status, 0)
-    lab.insert("second", 2)
-    refused = pair(lab, "alice", only_identity(lab, "Carol Cooper"))
+    check.assertEqual(pair(lab, "alice", present(lab, "rsa", "Alice Archer")).status, 0)
+
+    refused = pair(lab, "alice", present(lab, "second", "Carol Cooper", 2))
 
     check.assertEqual(refused.status, 255)
     check.assertEqual(refused.output, "Cannot pair user who is already paired\n")
