@@ -92,7 +92,7 @@ def a_slow_card_keeps_nobody_else_waiting(lab):
 
     check.assertIn(hash_, pairings.output)
     check.assertEqual(bound.status, 0, bound)
-    check.assertLess(time.monotonic() - began, 1.5)
+    check.assertLess(time.monotonic() - began, 4)
     lab.wait_until("the slow card is listed", lambda: "Grace Gardener" in identities(lab), 60)
 
 
