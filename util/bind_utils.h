@@ -5,9 +5,9 @@
 // Shapes:   names and texts are UTF-8. The text form of binary data is two upper-case hexadecimal
 //           digits per byte with nothing between them.
 // Threads:  any; there is no state but the log handle.
-// Blocking: the name and id lookups may wait for a directory server, the switches on the file
-// system. Errors:   none are reported; each operation says what it answers instead. In tests:
-// tests/unit/util/
+// Blocking: looking up names and ids may wait for a directory server, the switches for the disk.
+// Errors:   none are reported; each operation says what it answers instead.
+// In tests: tests/unit/util/
 
 #pragma once
 

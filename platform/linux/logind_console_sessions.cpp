@@ -49,8 +49,8 @@ bool is(int (*get)(const char* session, char** text), const std::string& id,
     return known && text && text == expected;
 }
 
-// The state says more than whether a session is the active one of its seat: that, it stays after its
-// user has logged out, as long as a program is left behind in it.
+// A session stays the active one of its seat after its user has logged out, as long as a program is
+// left behind in it. Its state tells.
 bool isOnConsole(const std::string& id) {
     return is(sd_session_get_class, id, "user") && is(sd_session_get_seat, id, "seat0") &&
            is(sd_session_get_state, id, "active");

@@ -14,7 +14,7 @@ what_is_left() {
     find /run/vlm-lab -maxdepth 1 -name "$name*"
     find /sys/fs/cgroup -maxdepth 2 -name "vlm-lab-$name*"
     # A process that nobody has waited for yet is in a "(deleted)" group.
-    grep -lE "/vlm-lab-$name[^ ]*$" /proc/[0-9]*/cgroup 2>/dev/null || true
+    grep -lE "/vlm-lab-${name}[^ ]*$" /proc/[0-9]*/cgroup 2>/dev/null || true
     grep "/run/vlm-lab/$name" /proc/self/mountinfo || true
 }
 
@@ -51,7 +51,7 @@ orphan=desktop-the-machine-is-healthy-$!
 sleep 1
 kill -KILL $!
 wait $! || true
-while grep -qE "/vlm-lab-$orphan[^ ]*$" /proc/[0-9]*/cgroup 2>/dev/null; do sleep 0.1; done
+while grep -qE "/vlm-lab-${orphan}[^ ]*$" /proc/[0-9]*/cgroup 2>/dev/null; do sleep 0.1; done
 "${command[@]}" up
 "${command[@]}" down
 nothing_is_left "$orphan" "of a scenario that was killed, when another machine was booted"
