@@ -11,17 +11,16 @@
 
 #pragma once
 
-#include <systemd/sd-event.h>
-
 #include <chrono>
+#include <cstdint>
 #include <deque>
 #include <functional>
 #include <map>
-#include <memory>
 #include <mutex>
 #include <optional>
 
 #include "platform/linux/file_descriptor.h"
+#include "platform/linux/sd_event_handles.h"
 
 namespace vlm::platform {
 
@@ -51,22 +50,15 @@ public:
 private:
     using Clock = std::chrono::steady_clock;
 
-    struct EventUnref {
-        void operator()(sd_event* event) const { sd_event_unref(event); }
-    };
-    struct SourceUnref {
-        void operator()(sd_event_source* source) const { sd_event_source_disable_unref(source); }
-    };
-
     static int onWork(sd_event_source* source, int descriptor, std::uint32_t events, void* loop);
     static int onTime(sd_event_source* source, std::uint64_t now, void* loop);
     void awaitNextTime();
     std::optional<int> endedWith() const;
 
-    std::unique_ptr<sd_event, EventUnref> _event;
+    SdEvent _event;
     FileDescriptor _waiting;  // counts the works that wait
-    std::unique_ptr<sd_event_source, SourceUnref> _onWork;
-    std::unique_ptr<sd_event_source, SourceUnref> _onTime;
+    SdEventSource _onWork;
+    SdEventSource _onTime;
 
     std::multimap<Clock::time_point, Work> _later;  // the loop's thread only
 

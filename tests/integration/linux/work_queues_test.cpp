@@ -1,5 +1,4 @@
-#include <condition_variable>
-#include <mutex>
+#include <latch>
 
 #include "fake_work_queues.h"
 #include "platform/linux/event_loop_work_queues.h"
@@ -74,21 +73,20 @@ TEST_F(EventLoopWorkQueuesTest, DoesMainWorkOnTheThreadOfTheLoopAndOtherWorkOnOt
 
 // Each work waits for the others, so this ends only if they run side by side.
 TEST_F(EventLoopWorkQueuesTest, DoesBackgroundWorkSideBySide) {
-    std::mutex mutex;
-    std::condition_variable allThere;
-    unsigned there = 0;
-    for (unsigned i = 0; i < platform::EventLoopWorkQueues::kMostThreads; ++i)
+    constexpr auto kWorks = platform::EventLoopWorkQueues::kMostThreads;
+    std::latch allThere(kWorks);
+    unsigned passed = 0;
+    for (unsigned i = 0; i < kWorks; ++i)
         queues().runInBackground([&] {
-            std::unique_lock lock(mutex);
-            if (++there == platform::EventLoopWorkQueues::kMostThreads) backend().end();
-            allThere.notify_all();
-            allThere.wait(lock,
-                          [&] { return there == platform::EventLoopWorkQueues::kMostThreads; });
+            allThere.arrive_and_wait();
+            queues().runOnMain([&] {
+                if (++passed == kWorks) backend().end();
+            });
         });
 
     backend().run();
 
-    EXPECT_EQ(there, platform::EventLoopWorkQueues::kMostThreads);
+    EXPECT_EQ(passed, kWorks);
 }
 
 TEST_F(EventLoopWorkQueuesTest, GoesAwayWithWorkThatWasNotDone) {

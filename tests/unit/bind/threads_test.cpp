@@ -56,9 +56,9 @@ TEST_F(Threads, TheCheckComesWhileTheFirstTokenDoes) {
         insertBlue();
         start();
         workQueues().advanceBy(30s);
-        const auto inserted = tokens.watcher.lock()->insertionHandler();
+        const auto watcher = tokens.watcher.lock();
 
-        besideTheMainQueue([&] { inserted(blue); });
+        besideTheMainQueue([&] { watcher->insert(blue); });
 
         const auto happened = events.take();
         if (operation->dialog()) {
