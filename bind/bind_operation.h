@@ -73,9 +73,9 @@ public:
     BindOperation(const BindOperation&) = delete;
     BindOperation& operator=(const BindOperation&) = delete;
 
-    // Returns at once. The reply is told how the operation ends, with the dialog's error if it gives
-    // one: in the background when the start finds nothing to offer, else on the main queue. It may
-    // be called again: a token that leaves late is told, too.
+    // Returns at once. The reply is told how the operation ends, with the dialog's error if it
+    // gives one: in the background when the start finds nothing to offer, else on the main queue.
+    // It may be called again: a token that leaves late is told, too.
     void startWithReply(Reply reply);
 
     // The dialog's end of the operation.
