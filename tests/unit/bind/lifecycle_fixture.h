@@ -71,6 +71,11 @@ protected:
         operation = makeOperation("alice");
     }
 
+    // An operation that has not ended and its dialog hold each other.
+    void TearDown() override {
+        if (operation) operation->setDialog(nullptr);
+    }
+
     std::shared_ptr<BindOperation> makeOperation(const std::string& user) {
         return BindOperation::initWithUserName(user, [this](const auto& forOperation) {
             auto made = std::make_shared<SilentDialog>(forOperation, events);
