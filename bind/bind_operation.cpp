@@ -6,15 +6,19 @@
 
 namespace vlm {
 
-std::shared_ptr<BindOperation> BindOperation::init() {
-    return initWithUserName(BindUtils::userNameForUserId(BindUtils::currentLoggedInUserId()));
+std::shared_ptr<BindOperation> BindOperation::init(PairingDialogMaker makeDialog) {
+    return initWithUserName(BindUtils::userNameForUserId(BindUtils::currentLoggedInUserId()),
+                            std::move(makeDialog));
 }
 
-std::shared_ptr<BindOperation> BindOperation::initWithUserName(OptionalText userName) {
-    return std::shared_ptr<BindOperation>(new BindOperation(std::move(userName)));
+std::shared_ptr<BindOperation> BindOperation::initWithUserName(OptionalText userName,
+                                                               PairingDialogMaker makeDialog) {
+    return std::shared_ptr<BindOperation>(
+        new BindOperation(std::move(userName), std::move(makeDialog)));
 }
 
-BindOperation::BindOperation(OptionalText userName) : _userName(std::move(userName)) {}
+BindOperation::BindOperation(OptionalText userName, PairingDialogMaker makeDialog)
+    : _userName(std::move(userName)), _makeDialog(std::move(makeDialog)) {}
 
 BindOperation::~BindOperation() = default;
 
@@ -32,6 +36,28 @@ std::shared_ptr<const BindOperation::UnpairedIdentities> BindOperation::unpaired
 
 void BindOperation::setUnpairedIdentities(std::optional<UnpairedIdentities> unpairedIdentities) {
     _unpairedIdentities.set(std::move(unpairedIdentities));
+}
+
+BindOperation::Reply BindOperation::reply() const {
+    const auto held = _reply.get();
+    return held ? *held : nullptr;
+}
+
+void BindOperation::setReply(Reply reply) { _reply.set(std::move(reply)); }
+
+std::shared_ptr<PairingDialog> BindOperation::dialog() const { return _dialog.get(); }
+
+void BindOperation::setDialog(std::shared_ptr<PairingDialog> dialog) {
+    _dialog.set(std::move(dialog));
+}
+
+std::shared_ptr<platform::TokenWatcher> BindOperation::tokenWatcher() const {
+    const auto held = _tokenWatcher.get();
+    return held ? *held : nullptr;
+}
+
+void BindOperation::setTokenWatcher(std::shared_ptr<platform::TokenWatcher> tokenWatcher) {
+    _tokenWatcher.set(std::move(tokenWatcher));
 }
 
 }  // namespace vlm

@@ -1,11 +1,17 @@
 // BindOperation: one attempt to pair a user with an identity of an inserted smart card.
 //
+// Started, an operation makes sure that its user may pair, watches tokens, shows its dialog while
+// there is something to offer, and reports how it ended. Made and not started, it only pairs and
+// unpairs.
+//
 // Shapes:    a token is named by its identifier, a key by its public-key hash.
-// Ownership: shared; background work, timers and handlers hold an operation weakly.
-// Threads:   the two maps of the token cache are shared with the token watcher's thread and with
-//            the windows': each is published whole, and a reader keeps the version it got. The
-//            other fields belong to whoever runs the operation.
+// Ownership: shared; background work, timers and handlers hold an operation weakly. It and its
+//            dialog hold each other until it has ended.
+// Threads:   starting works in the background; the token watcher calls on its own thread; all that
+//            is done with the dialog is done on the main queue. What they share is published whole,
+//            and a reader keeps the version it got. The user's name is set before the start.
 // Blocking:  whatever asks the hints service waits for its answer, and that may be a person's PIN.
+//            Starting and finishing never wait.
 // Errors:    a status, 0 for success, beside an error in the caller's place. An operation's own
 //            refusals are kRefused in VLErrorDomain; every other status is a service's.
 // In tests:  tests/unit/bind
@@ -20,6 +26,8 @@
 #include <string>
 #include <vector>
 
+#include "bind/dialog_place.h"
+#include "bind/pairing_dialog.h"
 #include "bind/snapshot.h"
 #include "bind/token_info.h"
 #include "platform/property_list.h"
@@ -30,8 +38,6 @@ class TokenWatcher;
 }
 
 namespace vlm {
-
-class PairingDialog;
 
 // How an operation ended.
 enum class BindResult : std::int32_t {
@@ -56,14 +62,29 @@ public:
     // The status of what an operation refuses itself.
     static constexpr platform::Status kRefused = -8;
 
-    // For the user who sits at this machine.
-    static std::shared_ptr<BindOperation> init();
+    // For the user who sits at this machine. An operation that is started makes its dialog with
+    // `makeDialog`; without one it shows nothing.
+    static std::shared_ptr<BindOperation> init(PairingDialogMaker makeDialog = {});
 
-    static std::shared_ptr<BindOperation> initWithUserName(OptionalText userName);
+    static std::shared_ptr<BindOperation> initWithUserName(OptionalText userName,
+                                                           PairingDialogMaker makeDialog = {});
 
     ~BindOperation();
     BindOperation(const BindOperation&) = delete;
     BindOperation& operator=(const BindOperation&) = delete;
+
+    // Returns at once. The reply is told how the operation ends, with the dialog's error if it
+    // gives one: in the background when the start finds nothing to offer, else on the main queue.
+    // It may be called again: a token that leaves late is told, too.
+    void startWithReply(Reply reply);
+
+    // The dialog's end of the operation.
+    void finishWithResult(BindResult result, const OptionalHash& publicKeyHash,
+                          const std::optional<platform::Error>& error);
+
+    // Closes the dialog and reports; a failure is shown to the user before that. The main queue's
+    // only.
+    void _showResultAlert(BindResult result, const std::optional<platform::Error>& error);
 
     // What the hints service tells about one token, or about all; TokenInfo reads it.
     std::optional<platform::PropertyList> tokenData(const OptionalText& token) const;
@@ -105,19 +126,39 @@ public:
     std::shared_ptr<const UnpairedIdentities> unpairedIdentities() const;
     void setUnpairedIdentities(std::optional<UnpairedIdentities> unpairedIdentities);
 
-    const Reply& reply() const { return _reply; }
-    void setReply(Reply reply) { _reply = std::move(reply); }
-    const std::shared_ptr<PairingDialog>& dialog() const { return _dialog; }
-    void setDialog(std::shared_ptr<PairingDialog> dialog) { _dialog = std::move(dialog); }
-    const std::shared_ptr<platform::TokenWatcher>& tokenWatcher() const { return _tokenWatcher; }
-    void setTokenWatcher(std::shared_ptr<platform::TokenWatcher> tokenWatcher) {
-        _tokenWatcher = std::move(tokenWatcher);
-    }
+    // Null when absent; the dialog is that also after the end.
+    Reply reply() const;
+    void setReply(Reply reply);
+    std::shared_ptr<PairingDialog> dialog() const;
+    void setDialog(std::shared_ptr<PairingDialog> dialog);
+    std::shared_ptr<platform::TokenWatcher> tokenWatcher() const;
+    void setTokenWatcher(std::shared_ptr<platform::TokenWatcher> tokenWatcher);
     const OptionalText& userName() const { return _userName; }
     void setUserName(OptionalText userName) { _userName = std::move(userName); }
 
 private:
-    explicit BindOperation(OptionalText userName);
+    BindOperation(OptionalText userName, PairingDialogMaker makeDialog);
+
+    template <typename... Arguments>
+    auto whileAlive(void (BindOperation::*step)(Arguments...));
+    void onMain(void (BindOperation::*step)());
+
+    void startUp();
+    bool mayPair() const;
+    bool offersSomething() const;
+    void watchTokens();
+    void checkForDialog();
+    void handleInsertion(const std::string& token);
+    void handleRemoval(const std::string& token);
+
+    void makeDialog();
+    void refreshDialog();
+    void closeDialog();
+    void cancel();
+    void showFailure(const std::shared_ptr<PairingDialog>& dialog,
+                     const std::optional<platform::Error>& error);
+    void end(BindResult result, const std::optional<platform::Error>& error);
+    void report(BindResult result, const std::optional<platform::Error>& error) const;
 
     UnpairedIdentities offeredIdentities(const TokenInfo& info,
                                          const std::vector<std::string>& candidates,
@@ -129,10 +170,11 @@ private:
 
     Snapshot<WrapKeysHashMap> _wrapKeysHashMap;
     Snapshot<UnpairedIdentities> _unpairedIdentities;
-    Reply _reply;
-    std::shared_ptr<PairingDialog> _dialog;
-    std::shared_ptr<platform::TokenWatcher> _tokenWatcher;
+    Snapshot<Reply> _reply;
+    DialogPlace _dialog;
+    Snapshot<std::shared_ptr<platform::TokenWatcher>> _tokenWatcher;
     OptionalText _userName;
+    const PairingDialogMaker _makeDialog;
 };
 
 }  // namespace vlm

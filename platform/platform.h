@@ -21,6 +21,8 @@ class Preferences;
 class ProcessInfo;
 class Sandbox;
 class SystemLog;
+class TokenFramework;
+class WorkQueues;
 
 class Platform {
 public:
@@ -34,6 +36,8 @@ public:
     ProcessInfo& processInfo();
     Sandbox& sandbox();
     SystemLog& systemLog();
+    TokenFramework& tokenFramework();
+    WorkQueues& workQueues();
 };
 
 // The platform of this process.

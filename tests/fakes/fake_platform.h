@@ -12,6 +12,8 @@
 #include "fake_preferences.h"
 #include "fake_process_info.h"
 #include "fake_sandbox.h"
+#include "fake_work_queues.h"
+#include "platform/token_watcher.h"
 #include "recording_system_log.h"
 
 namespace vlm::fakes {
@@ -33,6 +35,7 @@ public:
     FakePreferences fakePreferences;
     FakeProcessInfo fakeProcessInfo;
     FakeSandbox fakeSandbox;
+    FakeWorkQueues fakeWorkQueues;
     RecordingSystemLog recordingSystemLog;
 
     // What the code under test gets.
@@ -46,6 +49,8 @@ public:
     platform::ProcessInfo* processInfo = &fakeProcessInfo;
     platform::Sandbox* sandbox = &fakeSandbox;
     platform::SystemLog* systemLog = &recordingSystemLog;
+    platform::TokenFramework* tokenFramework = nullptr;
+    platform::WorkQueues* workQueues = &fakeWorkQueues;
 };
 
 }  // namespace vlm::fakes

@@ -13,6 +13,10 @@ namespace vlm::fakes {
 
 class PlatformTest : public ::testing::Test {
 protected:
+    ~PlatformTest() override {
+        EXPECT_EQ(workQueues().leftBehind(), "") << "work that is due was left behind";
+    }
+
     FakePlatform& fakePlatform() { return _platform; }
     FakeAccounts& accounts() { return _platform.fakeAccounts; }
     FakeConsoleSessions& sessions() { return _platform.fakeConsoleSessions; }
@@ -23,6 +27,7 @@ protected:
     FakePreferences& preferences() { return _platform.fakePreferences; }
     FakeProcessInfo& process() { return _platform.fakeProcessInfo; }
     FakeSandbox& sandbox() { return _platform.fakeSandbox; }
+    FakeWorkQueues& workQueues() { return _platform.fakeWorkQueues; }
     RecordingSystemLog& log() { return _platform.recordingSystemLog; }
 
 private:

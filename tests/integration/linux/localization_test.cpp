@@ -102,11 +102,11 @@ TEST(GettextLocalizationTest, DerivesTheLanguagesFromTheEnvironment) {
         EXPECT_EQ(platform::wantedLanguages(row.environment), row.expected) << row.why;
 }
 
-std::string textInEnvironment(std::map<std::string, std::optional<std::string>> environment) {
+std::string textInEnvironment(std::map<std::string, std::optional<std::string>> environment,
+                              const std::string& key = "SC_IS_ALREADY_PAIRED") {
     for (const auto* name : {"LANGUAGE", "LC_ALL", "LC_MESSAGES", "LANG"})
         environment.try_emplace(name, std::nullopt);
-    const auto ended =
-        run(probe({"text", "SC_IS_ALREADY_PAIRED"}), {.environment = environment, .user = {}});
+    const auto ended = run(probe({"text", key}), {.environment = environment, .user = {}});
     EXPECT_EQ(ended.status, 0) << ended.errors;
     return ended.output;
 }
@@ -128,6 +128,23 @@ TEST(InstalledTextsTest, AreGermanForGermans) {
     EXPECT_EQ(textInEnvironment({{"LANG", "en_US.UTF-8"}, {"LC_ALL", "de_DE"}}), german);
     EXPECT_EQ(textInEnvironment({{"LANG", "en_US.UTF-8"}, {"LANGUAGE", "tlh:de"}}), german);
     EXPECT_EQ(textInEnvironment({{"LANG", "de_DE"}, {"LC_ALL", ""}}), german);
+}
+
+TEST(InstalledTextsTest, NameTheReasonOfAFailedPairingInEveryLanguage) {
+    for (const std::string language : {"en_GB.UTF-8", "de_DE.UTF-8"}) {
+        const auto textOf = [&](const std::string& key) {
+            return textInEnvironment({{"LANG", language}}, key);
+        };
+        EXPECT_NE(textOf("OK"), "") << language;
+        EXPECT_NE(textOf("PAIRING_FAILED"), "") << language;
+        EXPECT_EQ(textOf("PAIRING_FAILED").find("{}"), std::string::npos) << language;
+
+        const std::string pattern = textOf("PAIRING_ERROR");
+        EXPECT_NE(pattern.find("{}"), std::string::npos) << language;
+        EXPECT_EQ(pattern.find("{}"), pattern.rfind("{}")) << language;
+    }
+    EXPECT_NE(textInEnvironment({{"LANG", "en"}}, "PAIRING_FAILED"),
+              textInEnvironment({{"LANG", "de"}}, "PAIRING_FAILED"));
 }
 
 }  // namespace

@@ -1,17 +1,19 @@
 #include "bind/bind_operation.h"
 
 #include "bind_operation_fixture.h"
+#include "scripted_tokens.h"
 
 namespace vlm {
 
-// Made up here: whoever shows dialogs and watches tokens is no part of these tests.
-class PairingDialog {};
-
-namespace platform {
-class TokenWatcher {};
-}  // namespace platform
-
 namespace {
+
+// Whoever shows dialogs is no part of these tests.
+class NoDialog final : public PairingDialog {
+    void showWindow() override {}
+    void refreshIdentities() override {}
+    void close() override {}
+    void showAlert(const platform::Alert&, std::function<void()>) override {}
+};
 
 class BindOperationFields : public BindOperationTest {};
 
@@ -53,8 +55,8 @@ TEST_F(BindOperationFields, StartAbsent) {
 TEST_F(BindOperationFields, HoldWhatTheirSettersAreGiven) {
     const Identities identities{{blue, {{blueSigning, "Alice"}}}};
     const WrapKeys keys{{blueWrap, blue}};
-    const auto dialog = std::make_shared<PairingDialog>();
-    const auto watcher = std::make_shared<platform::TokenWatcher>();
+    const auto dialog = std::make_shared<NoDialog>();
+    const auto watcher = std::make_shared<ScriptedWatcher>(std::set<std::string>());
     auto reported = BindResult::Succeeded;
 
     operation->setUnpairedIdentities(identities);
@@ -86,7 +88,7 @@ TEST_F(BindOperationFields, TellAnAbsentMapFromAnEmptyOne) {
 }
 
 TEST_F(BindOperationFields, AreReleasedWithTheOperation) {
-    const auto dialog = std::make_shared<PairingDialog>();
+    const auto dialog = std::make_shared<NoDialog>();
     operation->setDialog(dialog);
 
     operation.reset();
