@@ -8,6 +8,12 @@ find_package(OpenSSL 3 REQUIRED COMPONENTS Crypto)
 find_package(SQLite3 REQUIRED)
 find_package(SQLiteCpp REQUIRED)
 
+# Without its -pthread, which says nothing new here, and with which no precompiled header is used.
+pkg_check_modules(PCSC REQUIRED libpcsclite)
+add_library(vlm::pcsc INTERFACE IMPORTED)
+target_include_directories(vlm::pcsc INTERFACE ${PCSC_INCLUDE_DIRS})
+target_link_libraries(vlm::pcsc INTERFACE ${PCSC_LINK_LIBRARIES})
+
 # The archive where there is one, so that no program loads a further library for it.
 pkg_check_modules(PUGIXML REQUIRED IMPORTED_TARGET pugixml>=1.10)
 find_library(VLM_PUGIXML_ARCHIVE NAMES libpugixml.a HINTS ${PUGIXML_LIBRARY_DIRS})

@@ -14,6 +14,12 @@ struct SdBusClose {
 };
 using SdBus = std::unique_ptr<sd_bus, SdBusClose>;
 
+// Closes the connection with what is still queued, and so never waits for the bus.
+struct SdBusLeave {
+    void operator()(sd_bus* bus) const { sd_bus_close_unref(bus); }
+};
+using LeavingSdBus = std::unique_ptr<sd_bus, SdBusLeave>;
+
 struct SdBusMessageUnref {
     void operator()(sd_bus_message* message) const { sd_bus_message_unref(message); }
 };

@@ -2,7 +2,7 @@
 
 build_packages=(
     ca-certificates ccache cmake g++ gettext ninja-build pkg-config
-    libp11-kit-dev libpugixml-dev libseccomp-dev libsqlite3-dev libsqlitecpp-dev libssl-dev libsystemd-dev
+    libp11-kit-dev libpcsclite-dev libpugixml-dev libseccomp-dev libsqlite3-dev libsqlitecpp-dev libssl-dev libsystemd-dev
 )
 
 # A software card, the standard tools that fill it, and a message bus.

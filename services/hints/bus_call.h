@@ -46,12 +46,8 @@ private:
     static int onReply(sd_bus_message* reply, void* self, sd_bus_error* error);
     void finish(Outcome<platform::Message> outcome);
 
-    struct Leave {
-        void operator()(sd_bus* bus) const { sd_bus_close_unref(bus); }
-    };
-
     Answer _answer;
-    std::unique_ptr<sd_bus, Leave> _bus;
+    platform::LeavingSdBus _bus;
     platform::SdBusSlot _call;
     EventSource _later;
 };

@@ -37,6 +37,7 @@ public:
         _tokens.list([work = _idleness.begin(), answer = std::move(answer)](
                          std::vector<Token> tokens) { answer(std::move(tokens)); });
     }
+    LookAgain lookAgain() const override { return _tokens.lookAgain(); }
     void prove(ProofRequest request, std::function<void(Proof)> answer) override {
         _tokens.prove(std::move(request), [work = _idleness.begin(), answer = std::move(answer)](
                                               Proof proof) { answer(std::move(proof)); });

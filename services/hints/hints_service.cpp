@@ -123,7 +123,9 @@ Outcome<Message> HintsService::describeTokens(const Caller& caller, const std::s
     TokenInfoRequest request{.onlyToken = onlyToken, .now = _parts.now()};
     if (!caller.isRoot())
         request.onlyAccount = platform::current().accounts().userName(caller.user).value_or("");
-    return tokenInfoReply(tokenInfo(tokens, pairings, request));
+    auto reply = tokenInfoReply(tokenInfo(tokens, pairings, request));
+    if (reply) reply->set("num1", static_cast<std::int64_t>(_parts.login.tokens.lookAgain()));
+    return reply;
 }
 
 Outcome<Message> HintsService::pair(const Caller& caller, const Request& request) {

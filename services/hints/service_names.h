@@ -18,4 +18,7 @@ inline constexpr const char* kPromptersInterface = "org.vlm.token.hints.Prompter
 // Such an instance's, for the daemon: AskPin(a{sv} question) -> a{sv} answer
 inline constexpr const char* kPrompterInterface = "org.vlm.token.hints.Prompter";
 
+// The agent's, for programs that watch tokens: Watch() -> as; signals Inserted(s) and Removed(s)
+inline constexpr const char* kTokensInterface = "org.vlm.token.hints.Tokens";
+
 }  // namespace vlm::service

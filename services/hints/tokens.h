@@ -79,12 +79,23 @@ struct Proof {
     std::string reason;  // why it failed, for people; holds no secret
 };
 
+// When a listing has to be asked for again by who wants to know of every token. The numbers are
+// those of a reply.
+enum class LookAgain {
+    OnCardEvent = 0,  // when a card or a reader comes or goes
+    NowAndThen = 1,   // a token may come to a software module, which announces nothing
+    Soon = 2,         // a card is being read; it is not in the listing yet
+};
+
 class Tokens {
 public:
     virtual ~Tokens() = default;
 
     // The inserted tokens, sorted by identifier.
     virtual void list(std::function<void(std::vector<Token>)> answer) = 0;
+
+    // As of the last listing.
+    virtual LookAgain lookAgain() const = 0;
 
     // Logs in with the PIN exactly once and lets the key sign the challenge. The caller checks the
     // signature: a module is foreign code and is not believed.

@@ -2,6 +2,7 @@
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_daemon_link.h"
 #include "services/hints/bus_server.h"
+#include "services/hints/bus_token_watches.h"
 #include "services/hints/desktop_pin_prompt.h"
 #include "services/hints/forwarding_service.h"
 #include "services/hints/hints_log.h"
@@ -46,7 +47,8 @@ InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
     BusDaemonLink daemon(loop.get());
     ForwardingService service(daemon, callers);
     BusServer server(connection, kHintsInterface, "Exchange", service);
-    if (!server.start()) return {"the bus does not take the service"};
+    BusTokenWatches watches({loop.get(), connection, callers, daemon});
+    if (!server.start() || !watches.start()) return {"the bus does not take the service"};
 
     // Without a system bus there is no daemon that could ask; requests say so themselves.
     const auto systemBus =

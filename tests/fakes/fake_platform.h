@@ -12,8 +12,8 @@
 #include "fake_preferences.h"
 #include "fake_process_info.h"
 #include "fake_sandbox.h"
+#include "fake_token_framework.h"
 #include "fake_work_queues.h"
-#include "platform/token_watcher.h"
 #include "recording_system_log.h"
 
 namespace vlm::fakes {
@@ -35,6 +35,7 @@ public:
     FakePreferences fakePreferences;
     FakeProcessInfo fakeProcessInfo;
     FakeSandbox fakeSandbox;
+    FakeTokenFramework fakeTokenFramework;
     FakeWorkQueues fakeWorkQueues;
     RecordingSystemLog recordingSystemLog;
 
@@ -49,7 +50,7 @@ public:
     platform::ProcessInfo* processInfo = &fakeProcessInfo;
     platform::Sandbox* sandbox = &fakeSandbox;
     platform::SystemLog* systemLog = &recordingSystemLog;
-    platform::TokenFramework* tokenFramework = nullptr;
+    platform::TokenFramework* tokenFramework = &fakeTokenFramework;
     platform::WorkQueues* workQueues = &fakeWorkQueues;
 };
 

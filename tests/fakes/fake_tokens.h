@@ -31,6 +31,7 @@ public:
         _failure = outcome;
         _reason = reason;
     }
+    void announceNothing() { _lookAgain = service::LookAgain::NowAndThen; }
     void signWithAnotherKey() { _signsWrongly = true; }
 
     // Lets the cards answer everything that was asked of them, also in the course of it.
@@ -58,6 +59,7 @@ public:
         ++listings;
         _due.emplace_back([this, answer = std::move(answer)] { answer(_tokens); });
     }
+    service::LookAgain lookAgain() const override { return _lookAgain; }
     void prove(service::ProofRequest request, std::function<void(service::Proof)> answer) override {
         pinsTried.emplace_back(request.pin.text());
         challenges.push_back(request.challenge);
@@ -113,6 +115,7 @@ private:
     std::optional<service::Proof::Outcome> _failure;
     std::string _reason;
     bool _signsWrongly = false;
+    service::LookAgain _lookAgain = service::LookAgain::OnCardEvent;
 };
 
 }  // namespace vlm::fakes

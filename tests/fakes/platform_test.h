@@ -27,6 +27,7 @@ protected:
     FakePreferences& preferences() { return _platform.fakePreferences; }
     FakeProcessInfo& process() { return _platform.fakeProcessInfo; }
     FakeSandbox& sandbox() { return _platform.fakeSandbox; }
+    FakeTokenFramework& tokenFramework() { return _platform.fakeTokenFramework; }
     FakeWorkQueues& workQueues() { return _platform.fakeWorkQueues; }
     RecordingSystemLog& log() { return _platform.recordingSystemLog; }
 

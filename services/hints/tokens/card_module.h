@@ -29,6 +29,8 @@ public:
     CardModule(std::unique_ptr<Pkcs11Module> module, std::chrono::milliseconds lookAgainAfter);
 
     Listing list(std::int64_t now);
+    // Whether a token can come without a word. A module without any slot waits for a reader.
+    bool announcesNothing() const { return _module->hasSlots() && _module->isSoftware(); }
     Proof prove(ProofRequest request);
 
 private:

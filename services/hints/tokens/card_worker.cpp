@@ -91,6 +91,7 @@ void CardWorker::limitCurrent() {
     }
     _current->limit = callAfter(_event, _limits.list, [this, end, rest = most - _limits.list] {
         _current->limit = callAfter(_event, rest, end);
+        _isBehind = true;
         std::exchange(_current->listed, nullptr)(_tokens);
     });
 }
@@ -151,6 +152,8 @@ void CardWorker::finishList(ListAnswer answer) {
     if (!answer.tokens && !_hasListed) return fail("gave an answer that makes no sense");
     if (answer.tokens) _tokens = std::move(*answer.tokens);
     _hasListed = true;
+    _isBehind = false;
+    _announcesNothing = answer.announcesNothing;
     std::string problems;
     for (const std::string& problem : answer.problems)
         problems += (problems.empty() ? "" : "; ") + problem;
@@ -184,7 +187,10 @@ void CardWorker::goIdle() {
 void CardWorker::waitedTooLong(std::list<Job>::iterator job) {
     const Job late = std::move(*job);
     _waiting.erase(job);
-    if (!late.proof) return late.listed(_tokens);
+    if (!late.proof) {
+        _isBehind = true;
+        return late.listed(_tokens);
+    }
     late.proved(
         {Proof::Outcome::CardFailed, {}, PinState::Ready, "the card is busy with another login"});
 }
@@ -196,6 +202,7 @@ void CardWorker::fail(const std::string& why) {
     if (_process) _graveyard.bury(std::move(*_process));
     _process.reset();
     _tokens.clear();
+    _isBehind = false;
     report("the card module " + _name + " " + why);
     if (!_current) return;
     const Job job = std::move(*_current);
@@ -209,6 +216,11 @@ void CardWorker::fail(const std::string& why) {
                 {},
                 PinState::Ready,
                 "the module of the card (" + _name + ") " + why});
+}
+
+LookAgain CardWorker::lookAgain() const {
+    if (_isBehind) return LookAgain::Soon;
+    return _announcesNothing ? LookAgain::NowAndThen : LookAgain::OnCardEvent;
 }
 
 // The same trouble again and again is said once.

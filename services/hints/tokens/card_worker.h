@@ -54,6 +54,7 @@ public:
 
     // As of the last listing.
     const Tokens& lastTokens() const { return _tokens; }
+    LookAgain lookAgain() const;
 
 private:
     struct Job {
@@ -94,6 +95,8 @@ private:
     EventSource _readable;
     FrameAssembler _incoming;
     bool _hasListed = false;  // this process has told its tokens
+    bool _isBehind = false;   // an asker did not wait for the end of a listing
+    bool _announcesNothing = false;
 
     Tokens _tokens;
     std::optional<std::string> _reported;  // the last line that was logged, while it stays true

@@ -91,6 +91,11 @@ bool Pkcs11Module::isSoftware() const {
     });
 }
 
+bool Pkcs11Module::hasSlots() const {
+    const auto all = slots(false);
+    return all && !all->empty();
+}
+
 std::optional<Pkcs11Session> Pkcs11Module::openSession(CK_SLOT_ID slot) const {
     CK_SESSION_HANDLE session = 0;
     if (_module->C_OpenSession(slot, CKF_SERIAL_SESSION, nullptr, nullptr, &session) != CKR_OK)

@@ -88,6 +88,7 @@ public:
 
     // Whether no slot stands for a machine's device: nothing announces a new token then.
     bool isSoftware() const;
+    bool hasSlots() const;
 
     std::optional<Pkcs11Session> openSession(CK_SLOT_ID slot) const;
     bool offers(CK_SLOT_ID slot, CK_MECHANISM_TYPE mechanism) const;

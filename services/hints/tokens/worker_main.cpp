@@ -61,7 +61,7 @@ private:
     std::optional<Bytes> list() {
         if (const auto failed = load()) return encodeAnswer(*failed);
         auto [tokens, problems] = _module->list(std::time(nullptr));
-        ListAnswer answer{std::nullopt, std::move(problems)};
+        ListAnswer answer{std::nullopt, std::move(problems), _module->announcesNothing()};
         if (_told != tokens) answer.tokens = _told = std::move(tokens);
         return encodeAnswer(answer);
     }

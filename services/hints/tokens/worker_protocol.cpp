@@ -169,6 +169,7 @@ std::optional<ListAnswer> decodeListAnswer(Entries entries) {
         if (each.text() == nullptr) return {};
         answer.problems.push_back(cardText(*each.text(), kMostReasonCharacters));
     }
+    answer.announcesNothing = entries.boolean("silent");
     if (entries.has("tokens")) {
         answer.tokens.emplace();
         for (const PropertyList& each : entries.array("tokens", kMostTokens)) {
@@ -225,7 +226,7 @@ std::optional<Bytes> encodeAnswer(const ListAnswer& answer) {
     Array problems;
     for (const std::string& problem : answer.problems)
         if (problems.size() < kMostProblems) problems.emplace_back(problem);
-    Dictionary message{{"problems", std::move(problems)}};
+    Dictionary message{{"problems", std::move(problems)}, {"silent", answer.announcesNothing}};
     if (answer.tokens) {
         Array tokens;
         for (const Token& token : *answer.tokens) tokens.push_back(encode(token));

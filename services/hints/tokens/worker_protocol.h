@@ -33,6 +33,7 @@ std::optional<std::variant<ListRequest, ProofRequest>> decodeRequest(
 struct ListAnswer {
     std::optional<std::vector<Token>> tokens;
     std::vector<std::string> problems;  // for the log
+    bool announcesNothing = false;      // no reader tells when a token comes to this module
 };
 struct FailedAnswer {
     std::string reason;  // why the module is of no use

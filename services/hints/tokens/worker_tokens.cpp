@@ -50,6 +50,13 @@ void WorkerTokens::finishRound() {
     for (const auto& asker : askers) asker(tokens);
 }
 
+// What is soonest for one of the modules.
+LookAgain WorkerTokens::lookAgain() const {
+    auto soonest = LookAgain::OnCardEvent;
+    for (const auto& worker : _workers) soonest = std::max(soonest, worker->lookAgain());
+    return soonest;
+}
+
 CardWorker* WorkerTokens::workerOf(const std::string& tokenIdentifier) {
     const auto worker = std::ranges::find_if(_workers, [&tokenIdentifier](const auto& each) {
         return std::ranges::count(each->lastTokens(), tokenIdentifier, &Token::identifier) > 0;

@@ -34,6 +34,7 @@ public:
     WorkerTokens(sd_event* event, const WorkerTokensOptions& options);
 
     void list(std::function<void(std::vector<Token>)> answer) override;
+    LookAgain lookAgain() const override;
     void prove(ProofRequest request, std::function<void(Proof)> answer) override;
 
 private:

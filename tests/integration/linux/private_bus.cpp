@@ -50,7 +50,18 @@ std::string configuration(const PrivateBus::Options& options, const std::filesys
 }  // namespace
 
 PrivateBus::PrivateBus(const Options& options) {
-    const auto file = _folder.write("bus.conf", configuration(options, _folder.path()));
+    _folder.write("bus.conf", configuration(options, _folder.path()));
+    start();
+}
+
+void PrivateBus::restart() {
+    stop();
+    std::filesystem::remove(_folder.path() / "bus");
+    start();
+}
+
+void PrivateBus::start() {
+    const auto file = _folder.path() / "bus.conf";
     _daemon = std::make_unique<Child>(
         std::vector<std::string>{"dbus-daemon", "--nofork", "--nopidfile", "--nosyslog",
                                  "--print-address", "--config-file=" + file.string()});

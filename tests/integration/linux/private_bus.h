@@ -41,7 +41,12 @@ public:
     // The bus goes away, as after a crash.
     void stop() { _daemon.reset(); }
 
+    // And is back under the same address, without a connection to it.
+    void restart();
+
 private:
+    void start();
+
     TemporaryFolder _folder;
     std::unique_ptr<Child> _daemon;
     std::string _address;

@@ -34,6 +34,8 @@ public:
     void insertCard(const std::string& name = "Alice Example");
     const std::string& hash() const { return _hash; }
     const std::string& token() const { return _token; }
+    void removeCard() { _cards.remove("Card"); }
+    SoftCards& cards() { return _cards; }
 
     // Starts an instance and waits until it has its name.
     void startDaemon(std::vector<std::string> moreArguments = {});

@@ -81,11 +81,13 @@ TEST_F(BadModulesTest, OneThatIsSlowIsListedWithoutUntilItHasAnswered) {
 
     EXPECT_THAT(list(), IsEmpty());
     EXPECT_THAT(list(), IsEmpty()) << "whoever asks while it is read waits no longer either";
+    EXPECT_EQ(tokens().lookAgain(), service::LookAgain::Soon);
     std::ofstream(gate) << "open";
     std::vector<Token> listed;
     while (listed.empty()) listed = list();
 
     EXPECT_THAT(namesOf(listed), ElementsAre("good"));
+    EXPECT_NE(tokens().lookAgain(), service::LookAgain::Soon);
     EXPECT_THAT(warnings(), IsEmpty()) << "it was not ended";
 }
 

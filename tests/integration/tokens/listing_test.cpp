@@ -27,6 +27,17 @@ TEST_F(ListingTest, IsEmptyWithoutAnyModule) {
     EXPECT_THAT(warnings(), IsEmpty());
 }
 
+TEST_F(ListingTest, SaysWhetherATokenMayComeUnannounced) {
+    list();
+    EXPECT_EQ(tokens().lookAgain(), service::LookAgain::NowAndThen);
+
+    dropTokens();
+    cards.configureModule("softhsm", "module:\n");
+    list();
+
+    EXPECT_EQ(tokens().lookAgain(), service::LookAgain::OnCardEvent);
+}
+
 TEST_F(ListingTest, LeavesOutAnUninitialisedToken) {
     // The software module always has an empty token in its last slot.
     EXPECT_THAT(list(), IsEmpty());

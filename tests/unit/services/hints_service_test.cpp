@@ -61,6 +61,18 @@ TEST_F(HintsServiceTest, TellsTheTokenInfoInTheContextOfAList) {
     EXPECT_EQ(*record->dictionary()->find("unv"), PropertyList(PropertyList::Array{"Alice"}));
 }
 
+TEST_F(HintsServiceTest, TellsWhenToLookAgain) {
+    const auto lookAgain = [&] {
+        const auto reply = ask(root(), requestOf(1, {{"uid", signedNumber(-1)}}));
+        return reply ? reply->integer("num1") : std::nullopt;
+    };
+    EXPECT_EQ(lookAgain(), 0);
+
+    tokens.announceNothing();
+
+    EXPECT_EQ(lookAgain(), 1);
+}
+
 class ListingTest : public HintsServiceTest {
 protected:
     ListingTest() {

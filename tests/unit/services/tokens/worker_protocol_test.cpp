@@ -54,11 +54,12 @@ TEST(WorkerProtocolTest, CarriesTokens) {
     poor.wrapKeyHash.reset();
     const std::vector<Token> tokens = {sampleToken(), poor};
 
-    const auto answer = roundTrip(ListAnswer{tokens, {"one problem"}});
+    const auto answer = roundTrip(ListAnswer{tokens, {"one problem"}, true});
 
     ASSERT_TRUE(answer);
     EXPECT_EQ(answer->tokens, tokens);
     EXPECT_EQ(answer->problems, std::vector<std::string>{"one problem"});
+    EXPECT_TRUE(answer->announcesNothing);
 }
 
 TEST(WorkerProtocolTest, TellsNoTokensFromUnchangedOnes) {
@@ -132,7 +133,8 @@ Dictionary tokenEntries() {
 }
 
 std::optional<std::vector<Token>> decodeTokens(Array tokens) {
-    const PropertyList message = Dictionary{{"problems", Array{}}, {"tokens", std::move(tokens)}};
+    const PropertyList message =
+        Dictionary{{"problems", Array{}}, {"silent", false}, {"tokens", std::move(tokens)}};
     const auto answer = decodeAnswer(*platform::writeBinaryPropertyList(message));
     const auto* list = answer ? std::get_if<ListAnswer>(&*answer) : nullptr;
     if (list == nullptr) return {};
@@ -234,7 +236,9 @@ TEST(WorkerProtocolTest, RefusesWhatIsNoMessage) {
                                              Array{},
                                              5,
                                              "list",
-                                             Dictionary{{"problems", Array{5}}},
+                                             Dictionary{{"problems", Array{5}}, {"silent", false}},
+                                             Dictionary{{"problems", Array{}}},
+                                             Dictionary{{"problems", Array{}}, {"silent", 1}},
                                              Dictionary{{"failed", 5}}};
     for (const PropertyList& each : cases) {
         const auto message = platform::writeBinaryPropertyList(each);
