@@ -21,6 +21,7 @@ class Preferences;
 class ProcessInfo;
 class Sandbox;
 class SystemLog;
+class Windowing;
 
 class Platform {
 public:
@@ -34,6 +35,7 @@ public:
     ProcessInfo& processInfo();
     Sandbox& sandbox();
     SystemLog& systemLog();
+    Windowing& windowing();
 };
 
 // The platform of this process.

@@ -31,6 +31,7 @@ Preferences& Platform::preferences() { return *fakes::installed->preferences; }
 ProcessInfo& Platform::processInfo() { return *fakes::installed->processInfo; }
 Sandbox& Platform::sandbox() { return *fakes::installed->sandbox; }
 SystemLog& Platform::systemLog() { return *fakes::installed->systemLog; }
+Windowing& Platform::windowing() { return *fakes::installed->windowing; }
 
 Platform& current() {
     static Platform platform;

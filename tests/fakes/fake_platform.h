@@ -12,6 +12,7 @@
 #include "fake_preferences.h"
 #include "fake_process_info.h"
 #include "fake_sandbox.h"
+#include "fake_windowing.h"
 #include "recording_system_log.h"
 
 namespace vlm::fakes {
@@ -33,6 +34,7 @@ public:
     FakePreferences fakePreferences;
     FakeProcessInfo fakeProcessInfo;
     FakeSandbox fakeSandbox;
+    FakeWindowing fakeWindowing;
     RecordingSystemLog recordingSystemLog;
 
     // What the code under test gets.
@@ -46,6 +48,7 @@ public:
     platform::ProcessInfo* processInfo = &fakeProcessInfo;
     platform::Sandbox* sandbox = &fakeSandbox;
     platform::SystemLog* systemLog = &recordingSystemLog;
+    platform::Windowing* windowing = &fakeWindowing;
 };
 
 }  // namespace vlm::fakes

@@ -23,6 +23,7 @@ protected:
     FakePreferences& preferences() { return _platform.fakePreferences; }
     FakeProcessInfo& process() { return _platform.fakeProcessInfo; }
     FakeSandbox& sandbox() { return _platform.fakeSandbox; }
+    FakeWindowing& windowing() { return _platform.fakeWindowing; }
     RecordingSystemLog& log() { return _platform.recordingSystemLog; }
 
 private:
