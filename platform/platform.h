@@ -22,6 +22,7 @@ class ProcessInfo;
 class Sandbox;
 class SystemLog;
 class TokenFramework;
+class Windowing;
 class WorkQueues;
 
 class Platform {
@@ -37,6 +38,7 @@ public:
     Sandbox& sandbox();
     SystemLog& systemLog();
     TokenFramework& tokenFramework();
+    Windowing& windowing();
     WorkQueues& workQueues();
 };
 

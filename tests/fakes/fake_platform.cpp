@@ -32,6 +32,7 @@ ProcessInfo& Platform::processInfo() { return *fakes::installed->processInfo; }
 Sandbox& Platform::sandbox() { return *fakes::installed->sandbox; }
 SystemLog& Platform::systemLog() { return *fakes::installed->systemLog; }
 TokenFramework& Platform::tokenFramework() { return *fakes::installed->tokenFramework; }
+Windowing& Platform::windowing() { return *fakes::installed->windowing; }
 WorkQueues& Platform::workQueues() { return *fakes::installed->workQueues; }
 
 Platform& current() {

@@ -13,6 +13,7 @@
 #include "fake_process_info.h"
 #include "fake_sandbox.h"
 #include "fake_token_framework.h"
+#include "fake_windowing.h"
 #include "fake_work_queues.h"
 #include "recording_system_log.h"
 
@@ -36,6 +37,7 @@ public:
     FakeProcessInfo fakeProcessInfo;
     FakeSandbox fakeSandbox;
     FakeTokenFramework fakeTokenFramework;
+    FakeWindowing fakeWindowing;
     FakeWorkQueues fakeWorkQueues;
     RecordingSystemLog recordingSystemLog;
 
@@ -51,6 +53,7 @@ public:
     platform::Sandbox* sandbox = &fakeSandbox;
     platform::SystemLog* systemLog = &recordingSystemLog;
     platform::TokenFramework* tokenFramework = &fakeTokenFramework;
+    platform::Windowing* windowing = &fakeWindowing;
     platform::WorkQueues* workQueues = &fakeWorkQueues;
 };
 

@@ -28,6 +28,7 @@ protected:
     FakeProcessInfo& process() { return _platform.fakeProcessInfo; }
     FakeSandbox& sandbox() { return _platform.fakeSandbox; }
     FakeTokenFramework& tokenFramework() { return _platform.fakeTokenFramework; }
+    FakeWindowing& windowing() { return _platform.fakeWindowing; }
     FakeWorkQueues& workQueues() { return _platform.fakeWorkQueues; }
     RecordingSystemLog& log() { return _platform.recordingSystemLog; }
 

@@ -26,6 +26,8 @@ expect() {  # pass|fail FILE INCLUDE
 }
 
 expect pass tool/a.cpp '"bind/bind_operation.h"'
+expect pass ui/a.cpp '"bind/pairing_dialog.h"'
+expect pass ui/a.cpp '"platform/windowing.h"'
 expect pass tool/options.cpp '<unistd.h>'
 expect pass platform/linux/a.cpp '<systemd/sd-bus.h>'
 expect pass services/hints/a.cpp '"platform/linux/sd_bus_message.h"'
@@ -38,6 +40,9 @@ expect fail tool/a.cpp '"platform/linux/sd_bus_message.h"'
 expect fail tool/a.cpp '"services/hints/status.h"'
 expect fail bind/a.h '"tool/console.h"'
 expect fail bind/a.cpp '"ui/bind_dialog.h"'
+expect fail ui/a.cpp '<QWidget>'
+expect fail ui/a.cpp '"tool/console.h"'
+expect fail ui/a.cpp '"platform/linux/loaded_windowing.h"'
 expect fail hints/a.cpp '"settings/smartcard_settings.h"'
 expect fail platform/a.h '<openssl/evp.h>'
 expect fail platform/a.h '"hints/hints_client.h"'
