@@ -7,7 +7,7 @@ pkg_check_modules(P11KIT REQUIRED IMPORTED_TARGET p11-kit-1)
 find_package(OpenSSL 3 REQUIRED COMPONENTS Crypto)
 find_package(SQLite3 REQUIRED)
 find_package(SQLiteCpp REQUIRED)
-find_package(Qt6 6.4 REQUIRED COMPONENTS Widgets UiTools)
+find_package(Qt6 6.4 REQUIRED COMPONENTS Test UiTools Widgets)
 
 # The archive where there is one, so that no program loads a further library for it.
 pkg_check_modules(PUGIXML REQUIRED IMPORTED_TARGET pugixml>=1.10)
