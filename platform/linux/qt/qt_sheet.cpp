@@ -21,6 +21,18 @@ QMessageBox::Icon iconOf(AlertStyle style) {
     return QMessageBox::NoIcon;
 }
 
+constexpr int kNarrowestText = 280;  // points
+
+// The message is the title of what is explained below it.
+void showAsTitle(QMessageBox& box) {
+    auto* message = box.findChild<QLabel*>("qt_msgbox_label");
+    if (!message) return;
+    QFont font = message->font();
+    font.setBold(true);
+    message->setFont(font);
+    message->setMinimumWidth(kNarrowestText);
+}
+
 // Its labels would take an error text that looks like markup for markup, and open its links.
 void showPlainTextOnly(QMessageBox& box) {
     for (auto* label : box.findChildren<QLabel*>()) {
@@ -36,6 +48,7 @@ QMessageBox* openSheet(QWidget* parent, const Alert& alert, std::function<void()
                                 shownText(alert.message), QMessageBox::NoButton, parent);
     if (!alert.information.empty()) box->setInformativeText(shownText(alert.information));
     showPlainTextOnly(*box);
+    showAsTitle(*box);
     auto* button = box->addButton(shownText(alert.button), QMessageBox::AcceptRole);
     box->setDefaultButton(button);
     box->setEscapeButton(button);

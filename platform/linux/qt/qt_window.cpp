@@ -62,8 +62,9 @@ void QtWindow::setLevel(int level) {
 
 void QtWindow::centre() {
     _dialog->adjustSize();
-    const QRect screen = _dialog->screen()->availableGeometry();
-    _dialog->move(screen.center() - _dialog->rect().center());
+    QRect frame = _dialog->frameGeometry();
+    frame.moveCenter(_dialog->screen()->availableGeometry().center());
+    _dialog->move(frame.topLeft());
 }
 
 void QtWindow::makeKeyAndOrderFront() {

@@ -113,7 +113,7 @@ TEST_F(BindDialogDescription, TellsAScreenReaderWhatItsPartsAre) {
         const char* name;
     };
     const Row rows[] = {
-        {"identityPopup", QAccessible::ComboBox, "Identity"},
+        {"identityPopup", QAccessible::ComboBox, "Alice"},
         {"okButton", QAccessible::Button, "Pair"},
         {"cancelButton", QAccessible::Button, "Cancel"},
         {"dontShowAgainButton", QAccessible::Button, "Do not show again"},
@@ -125,6 +125,16 @@ TEST_F(BindDialogDescription, TellsAScreenReaderWhatItsPartsAre) {
         EXPECT_EQ(accessible->role(), row.role) << row.part;
         EXPECT_EQ(text(accessible->text(QAccessible::Name)), row.name);
     }
+}
+
+TEST_F(BindDialogDescription, TellsAScreenReaderWhatTheListIsCalled) {
+    auto* list = QAccessible::queryAccessibleInterface(&part<QComboBox>("identityPopup"));
+
+    const auto labels = list->relations(QAccessible::Label);
+
+    ASSERT_EQ(labels.size(), 1);
+    EXPECT_EQ(labels[0].first->object(), &part<QLabel>("identityLabel"));
+    EXPECT_NE(text(list->text(QAccessible::Description)), "");
 }
 
 TEST_F(BindDialogDescription, FloatsAboveOrdinaryWindows) {
@@ -139,8 +149,8 @@ TEST_F(BindDialogDescription, FloatsAboveOrdinaryWindows) {
 TEST_F(BindDialogDescription, IsInTheMiddleOfTheScreen) {
     window->centre();
 
-    const QPoint off =
-        bindDialog()->geometry().center() - bindDialog()->screen()->availableGeometry().center();
+    const QPoint off = bindDialog()->frameGeometry().center() -
+                       bindDialog()->screen()->availableGeometry().center();
     EXPECT_LE(off.manhattanLength(), 2);
 }
 

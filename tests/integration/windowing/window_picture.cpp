@@ -35,7 +35,7 @@ QPalette darkPalette() {
 }
 
 BindOperation::UnpairedIdentities identities(bool areLong) {
-    const std::string alice = areLong ? "Dr. Alexandra Wolkenstein-Rodriguez (Digital Signature, "
+    const std::string alice = areLong ? "Alexandra Wolkenstein-Rodriguez (Digital Signature, "
                                         "Example Certification Authority of the Northern Region)"
                                       : "Alice Example (Signature)";
     return {{"blue", {{{1}, alice}, {{2}, "Alice Example (Key Exchange)"}}},
