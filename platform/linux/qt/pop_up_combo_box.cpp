@@ -13,7 +13,7 @@ namespace {
 
 // In characters of average width.
 constexpr int kNarrowest = 24;
-constexpr int kWidest = 56;
+constexpr int kWidest = 84;
 
 }  // namespace
 
