@@ -1,12 +1,27 @@
 #include "platform/linux/qt/qt_window.h"
 
 #include <QAbstractButton>
+#include <QLayout>
 #include <QScreen>
+#include <algorithm>
 
 #include "platform/linux/qt/qt_sheet.h"
 #include "platform/linux/qt/text.h"
 
 namespace vlm::platform::qt {
+
+namespace {
+
+// As wide as its parts want to be, and then as high as its lines of text need. The toolkit's own
+// way takes the height for one width and then another width.
+void fit(QWidget& dialog, int widest) {
+    const QSize wanted = dialog.sizeHint();
+    const int width = std::min(wanted.width(), widest);
+    const int height = dialog.layout() ? dialog.layout()->totalHeightForWidth(width) : -1;
+    dialog.resize(width, height < 0 ? wanted.height() : height);
+}
+
+}  // namespace
 
 QtWindow::~QtWindow() {
     close();
@@ -61,9 +76,10 @@ void QtWindow::setLevel(int level) {
 }
 
 void QtWindow::centre() {
-    _dialog->adjustSize();
+    const QRect screen = _dialog->screen()->availableGeometry();
+    fit(*_dialog, screen.width());
     QRect frame = _dialog->frameGeometry();
-    frame.moveCenter(_dialog->screen()->availableGeometry().center());
+    frame.moveCenter(screen.center());
     _dialog->move(frame.topLeft());
 }
 

@@ -70,6 +70,8 @@ TEST_F(HostileText, ThatIsLongLeavesTheWindowItsWidth) {
     offer(std::string(5000, 'W'));
 
     EXPECT_LT(bindDialog()->width(), 1000);
+    const auto& information = part<QLabel>("informationLabel");
+    EXPECT_GE(information.height(), information.heightForWidth(information.width()));
 }
 
 TEST_F(HostileText, ATitleThatFitsNeedsNoToolTip) {
