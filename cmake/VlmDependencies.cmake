@@ -7,6 +7,7 @@ pkg_check_modules(P11KIT REQUIRED IMPORTED_TARGET p11-kit-1)
 find_package(OpenSSL 3 REQUIRED COMPONENTS Crypto)
 find_package(SQLite3 REQUIRED)
 find_package(SQLiteCpp REQUIRED)
+find_package(Qt6 6.4 REQUIRED COMPONENTS Test UiTools Widgets)
 
 # Without its -pthread, which says nothing new here, and with which no precompiled header is used.
 pkg_check_modules(PCSC REQUIRED libpcsclite)

@@ -6,7 +6,7 @@
 set -euo pipefail
 
 status=0
-for file in "$1"/bin/* "$1"/lib/libvlm.so; do
+for file in "$1"/bin/* "$1"/lib/libvlm.so "$1"/lib/vlm/*.so; do
     path=$(readelf -d "$file" | sed -n 's/.*R[UN]*PATH.*\[\(.*\)\]/\1:/p')
     while [[ $path ]]; do
         element=${path%%:*}

@@ -1,0 +1,28 @@
+#include "platform/linux/qt/qt_pop_up_button.h"
+
+#include "platform/linux/qt/text.h"
+
+namespace vlm::platform::qt {
+
+void QtPopUpButton::removeAllItems() {
+    _items.clear();
+    _box->clear();
+}
+
+void QtPopUpButton::append(const MenuItem& item) {
+    _items.push_back(item);
+    if (item.isSeparator)
+        _box->insertSeparator(_box->count());
+    else
+        _box->addItem(shownText(item.title));
+    if (_items.size() == 1) _box->setCurrentIndex(0);  // also a separator
+    _box->updateGeometry();
+}
+
+std::optional<MenuItem> QtPopUpButton::selectedItem() const {
+    const int index = _box->currentIndex();
+    if (index < 0) return std::nullopt;
+    return _items.at(static_cast<std::size_t>(index));
+}
+
+}  // namespace vlm::platform::qt

@@ -1,0 +1,64 @@
+#include "platform/linux/qt/qt_windowing.h"
+
+#include "platform/linux/qt/qt_window.h"
+#include "platform/linux/qt/window_loader.h"
+#include "platform/system_log.h"
+#include "platform/token_framework.h"
+
+namespace vlm::platform::qt {
+
+namespace {
+
+constexpr Log kLog(kTokenFramework, "windowing");
+
+// The last is a screen that nobody sees: without it, the toolkit would end the process when it can
+// reach no other. X comes first, since only there a window can float above all others and choose
+// its place.
+constexpr const char* kScreens = "xcb;wayland;offscreen";
+constexpr const char* kNoScreen = "offscreen";
+
+// The arguments have to last as long as the toolkit, which is for ever.
+void makeApplication() {
+    static char program[] = "vlmbind";
+    static char option[] = "-platform";
+    static std::string screens = kScreens;
+    static char* arguments[] = {program, option, screens.data(), nullptr};
+    static int count = 3;
+    if (qEnvironmentVariableIsSet("QT_QPA_PLATFORM")) count = 1;  // somebody knows better
+    new QApplication(count, arguments);
+}
+
+}  // namespace
+
+bool QtWindowing::start() {
+    if (!qApp) {
+        makeApplication();
+        QCoreApplication::installTranslator(&_texts);
+        QApplication::setQuitOnLastWindowClosed(false);
+    }
+    return QGuiApplication::platformName() != kNoScreen ||
+           qEnvironmentVariableIsSet("QT_QPA_PLATFORM");
+}
+
+std::unique_ptr<Window> QtWindowing::loadWindow(std::string_view description) {
+    if (!start()) {
+        kLog.error("loading the window {}: there is no screen to show it on",
+                   std::string(description));
+        return nullptr;
+    }
+    auto dialog = WindowLoader().load(description);
+    return dialog ? std::make_unique<QtWindow>(std::move(dialog)) : nullptr;
+}
+
+// A window manager may refuse to take the focus from somebody who types; then the window asks for
+// attention.
+void QtWindowing::activateIgnoringOthers() {
+    if (!qApp) return;
+    for (auto* window : QApplication::topLevelWidgets()) {
+        if (!window->isVisible() || !window->isWindow()) continue;
+        window->activateWindow();
+        QApplication::alert(window);
+    }
+}
+
+}  // namespace vlm::platform::qt
