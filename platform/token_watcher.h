@@ -8,7 +8,7 @@
 // Ownership: with the last reference to a watcher its handlers go; none is called after that.
 // Threads:   handlers are called on the watcher's own thread, one after another. Everything may be
 //            called on any thread, also by a handler.
-// Blocking:  never; letting go of a watcher waits for a handler that runs, but not on its own thread.
+// Blocking:  never; letting go of a watcher waits for a handler that runs on another thread.
 // Errors:    none; a service that cannot be reached is told in the log.
 // Behind it: platform/linux/bus_token_watcher.h
 // In tests:  tests/fakes/fake_token_framework.h, tests/contracts/token_watcher_contract.h

@@ -95,8 +95,8 @@ public:
     virtual IconView* iconView(std::string_view name) = 0;
     virtual TextLabel* textLabel(std::string_view name) = 0;
 
-    // Called for each click on the button of this name. The window's own close button clicks the one
-    // that the description names for it.
+    // Called for each click on the button of this name. The window's own close button clicks the
+    // one that the description names for it.
     virtual void onClick(std::string_view button, std::function<void()> action) = 0;
 
     // Higher levels float above lower ones; ordinary windows have level 0.

@@ -1,8 +1,8 @@
 // WorkQueues: work that is done later or elsewhere.
 //
-// The main queue is the loop that every window lives on. Work on it is done one after another, in the
-// order in which it was handed in; delayed work joins that order when its time has come. Background
-// work is done on threads of a small shared pool, side by side.
+// The main queue is the loop that every window lives on. Work on it is done one after another, in
+// the order in which it was handed in; delayed work joins that order when its time has come.
+// Background work is done on threads of a small shared pool, side by side.
 //
 // Ownership: a queue owns work until it is done. Work that may outlive what it is about holds that
 //            weakly.
