@@ -46,8 +46,9 @@ public:
     };
 
     static constexpr Duration kUntilSecondLook = std::chrono::seconds(1);
-    static constexpr Duration kLongestPause = std::chrono::seconds(32);
-    static constexpr int kMostLooksAtASlowCard = 6;
+    static constexpr Duration kLongestPause = std::chrono::seconds(4);
+    // With the five seconds that each may take, longer than the daemon lets a card be read.
+    static constexpr int kMostLooksAtASlowCard = 10;
     static constexpr Duration kNowAndThen = std::chrono::seconds(2);
 
     explicit TokenLookout(Parts parts);

@@ -31,9 +31,9 @@ protected:
 
     void watch() {
         watcher = platform::BusTokenFramework().watchTokens();
-        watcher->setInsertionHandler([this](const std::string& token) {
+        watcher->setInsertionHandler([this, &same = *watcher](const std::string& token) {
             note("+");
-            watcher->addRemovalHandler(token, [this](const std::string&) { note("-"); });
+            same.addRemovalHandler(token, [this](const std::string&) { note("-"); });
         });
     }
     void note(const std::string& sign) {
