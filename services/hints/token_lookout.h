@@ -9,9 +9,8 @@
 //
 // Ownership: its parts outlive it. It may not be destroyed by what it calls.
 // Threads:   the event loop's. Blocking: never.
-// Errors:    a daemon that cannot be reached, or refuses, is one log line until it answers again;
-// what
-//            is known stays.
+// Errors:    a daemon that cannot be reached, or refuses, is one log line until it answers again.
+//            What is known stays.
 // In tests:  tests/unit/services/token_lookout_test.cpp
 
 #pragma once
