@@ -106,10 +106,15 @@ void HintsService::login(const Caller& caller, Request request, const Answer& an
 
 void HintsService::describeTokens(const Caller& caller, const Request& request,
                                   const Answer& answer) {
-    _parts.login.tokens.list([this, alive = std::weak_ptr(_alive), caller, answer,
-                              only = request.tokenIdentifier](const std::vector<Token>& tokens) {
-        if (!alive.expired()) answer(describeTokens(caller, only, tokens));
-    });
+    _parts.login.tokens.list(
+        [this, alive = std::weak_ptr(_alive), caller, answer, only = request.tokenIdentifier,
+         asksWhen = request.asksWhenToLookAgain](const std::vector<Token>& tokens) {
+            if (alive.expired()) return;
+            auto reply = describeTokens(caller, only, tokens);
+            if (reply && asksWhen)
+                reply->set("num1", static_cast<std::int64_t>(_parts.login.tokens.lookAgain()));
+            answer(std::move(reply));
+        });
 }
 
 Outcome<Message> HintsService::describeTokens(const Caller& caller, const std::string& onlyToken,
@@ -123,9 +128,7 @@ Outcome<Message> HintsService::describeTokens(const Caller& caller, const std::s
     TokenInfoRequest request{.onlyToken = onlyToken, .now = _parts.now()};
     if (!caller.isRoot())
         request.onlyAccount = platform::current().accounts().userName(caller.user).value_or("");
-    auto reply = tokenInfoReply(tokenInfo(tokens, pairings, request));
-    if (reply) reply->set("num1", static_cast<std::int64_t>(_parts.login.tokens.lookAgain()));
-    return reply;
+    return tokenInfoReply(tokenInfo(tokens, pairings, request));
 }
 
 Outcome<Message> HintsService::pair(const Caller& caller, const Request& request) {

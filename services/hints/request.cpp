@@ -53,6 +53,8 @@ public:
         return *value == 1;
     }
 
+    bool optionalFlag(std::string_view key) { return isThere(key) && flag(key); }
+
     std::string text(std::string_view key, std::size_t most) {
         const auto* value = optionalText(key, most);
         if (!value && !_refusal) missing(key, "text");
@@ -134,6 +136,7 @@ void readArguments(Reader& reader, Request& request) {
             return readLogin(reader, request);
         case Operation::TokenInfo:
             request.tokenIdentifier = reader.queriedToken();
+            request.asksWhenToLookAgain = reader.optionalFlag("num1");
             request.user = reader.user();
             return;
         case Operation::Pair:

@@ -38,6 +38,7 @@ struct Request {
     std::string tokenIdentifier;                // Login; TokenInfo: empty for all tokens
     std::optional<Secret> pin;                  // Login, when the caller has it
     bool insertedOnly = false;                  // Pairings
+    bool asksWhenToLookAgain = false;           // TokenInfo
 };
 
 Outcome<Request> readRequest(const IncomingRequest& incoming);

@@ -19,6 +19,7 @@ platform::Message question() {
     platform::Message request;
     request.set("op", static_cast<std::uint64_t>(Operation::TokenInfo));
     request.set("uid", std::int64_t{-1});
+    request.set("num1", std::int64_t{1});
     return request;
 }
 

@@ -61,16 +61,18 @@ TEST_F(HintsServiceTest, TellsTheTokenInfoInTheContextOfAList) {
     EXPECT_EQ(*record->dictionary()->find("unv"), PropertyList(PropertyList::Array{"Alice"}));
 }
 
-TEST_F(HintsServiceTest, TellsWhenToLookAgain) {
-    const auto lookAgain = [&] {
-        const auto reply = ask(root(), requestOf(1, {{"uid", signedNumber(-1)}}));
+TEST_F(HintsServiceTest, TellsWhenToLookAgainIfAsked) {
+    const auto lookAgain = [&](std::int64_t asked) {
+        const auto reply =
+            ask(root(), requestOf(1, {{"uid", signedNumber(-1)}, {"num1", signedNumber(asked)}}));
         return reply ? reply->integer("num1") : std::nullopt;
     };
-    EXPECT_EQ(lookAgain(), 0);
+    EXPECT_EQ(lookAgain(1), 0);
+    EXPECT_EQ(lookAgain(0), std::nullopt);
 
     tokens.announceNothing();
 
-    EXPECT_EQ(lookAgain(), 1);
+    EXPECT_EQ(lookAgain(1), 1);
 }
 
 class ListingTest : public HintsServiceTest {
