@@ -42,7 +42,7 @@ void drawLock(QPainter& painter) {
 QPixmap securityLock(int points, qreal pixelRatio) {
     for (const char* name : {"system-lock-screen", "dialog-password", "security-high"}) {
         const QIcon icon = QIcon::fromTheme(name);
-        const QPixmap picture = icon.pixmap(QSize(points, points), pixelRatio);
+        QPixmap picture = icon.pixmap(QSize(points, points), pixelRatio);
         // A theme may have the picture for menus only, which is nothing to look at in this size.
         if (picture.deviceIndependentSize().width() >= points) return picture;
     }

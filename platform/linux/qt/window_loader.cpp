@@ -30,7 +30,7 @@ std::unique_ptr<DialogWindow> WindowLoader::load(std::string_view description) {
     if (!widget) return complain(errorString());
     auto* dialog = dynamic_cast<DialogWindow*>(widget.get());
     if (!dialog) return complain("it describes no dialog");
-    widget.release();
+    static_cast<void>(widget.release());
     return std::unique_ptr<DialogWindow>(dialog);
 }
 
