@@ -40,8 +40,8 @@ class Container:
         self.down()
         _clear_orphans()
         layers = image.layers()
-        self._state.mkdir(parents=True)
         try:
+            self._state.mkdir(parents=True)
             if ends_with_us:
                 (self._state / "owner").write_text(str(os.getpid()))
             installed = self._state / "installed"
@@ -55,7 +55,13 @@ class Container:
         """Leaves nothing of the machine, whatever state it was in."""
         for group in self._control_groups():
             _end(group)
-        shutil.rmtree(self._state, ignore_errors=True)
+
+        def removed() -> bool:  # An installation that was interrupted may still write a file.
+            shutil.rmtree(self._state, ignore_errors=True)
+            return not self._state.exists()
+
+        if not _wait_until(removed, DOWN_SECONDS):
+            raise LabError(f"{self._state} cannot be removed")
 
     def command(self, arguments: list[str]) -> list[str]:
         """What runs these arguments inside, as root and outside of any session or service."""
