@@ -12,6 +12,7 @@
 namespace vlm::platform {
 
 class Accounts;
+class Application;
 class ConsoleSessions;
 class Keychain;
 class Localization;
@@ -28,6 +29,7 @@ class WorkQueues;
 class Platform {
 public:
     Accounts& accounts();
+    Application& application();
     ConsoleSessions& consoleSessions();
     Keychain& keychain();
     Localization& localization();

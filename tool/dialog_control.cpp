@@ -18,11 +18,6 @@ void printState(bool enabled, Console& console) {
 
 }  // namespace
 
-int runAgent(Console& console) {
-    console.complain("Agent mode is not available in this version.");
-    return kExitFailure;
-}
-
 void forceBindUi(Console& console) {
     if (BindUtils::isBindEnabled()) {
         platform::current().notifications().post(kForceBindUi);

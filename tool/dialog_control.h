@@ -1,5 +1,4 @@
-// Control of the pairing dialog: running the agent that shows it, asking for it, and the user's
-// preference whether to be asked at all. This version has no dialog: running the agent says so.
+// Control of the pairing dialog: asking for it, and the user's preference whether to be asked at all.
 
 #pragma once
 
@@ -7,9 +6,6 @@
 #include "tool/options.h"
 
 namespace vlm {
-
-// Runs as the on-demand agent; the answer is an exit status.
-int runAgent(Console& console);
 
 // Asks the agent to show the dialog now, unless the machine has it turned off. Whether anybody
 // hears that shows in the log only.

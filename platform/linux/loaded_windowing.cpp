@@ -2,9 +2,11 @@
 
 #include <dlfcn.h>
 
+#include <algorithm>
+#include <cstdlib>
+#include <optional>
 #include <system_error>
 
-#include "platform/linux/windowing_module.h"
 #include "platform/platform.h"
 #include "platform/system_log.h"
 #include "platform/token_framework.h"
@@ -25,21 +27,29 @@ std::vector<std::filesystem::path> installedModules() {
     return {folder / "lib" / kModule, folder / VLM_LIBRARY_FOLDER / kModule};
 }
 
-Windowing* windowingOf(const std::filesystem::path& file) {
-    // Never closed: a toolkit cannot be taken out of a process again.
-    void* module = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
-    void* entry = module ? dlsym(module, kWindowingEntry) : nullptr;
-    if (!entry) {
-        kLog.error("loading the windows' module {}: {}", file.string(), std::string(dlerror()));
-        return nullptr;
-    }
-    return reinterpret_cast<WindowingEntry>(entry)();
+// Null when the module lacks it.
+template <typename Entry>
+Entry entry(void* module, const char* name) {
+    return reinterpret_cast<Entry>(dlsym(module, name));
 }
+
+// What the toolkit's loop calls for the one that it drives.
+struct DrivenLoop {
+    MainLoop& loop;
+    const EndLoopEntry endToolkit;
+    std::optional<int> ended;
+
+    static void dispatch(void* driven) {
+        auto& self = *static_cast<DrivenLoop*>(driven);
+        if (!self.ended) self.ended = self.loop.dispatch();
+        if (self.ended) self.endToolkit();
+    }
+};
 
 }  // namespace
 
 std::unique_ptr<Window> LoadedWindowing::loadWindow(std::string_view description) {
-    if (!_loaded) _loaded = loadModule();
+    if (!_loaded) load();
     return _loaded ? _loaded->loadWindow(description) : nullptr;
 }
 
@@ -47,17 +57,38 @@ void LoadedWindowing::activateIgnoringOthers() {
     if (_loaded) _loaded->activateIgnoringOthers();
 }
 
-Windowing* LoadedWindowing::loadModule() const {
+// The module is never closed: a toolkit cannot be taken out of a process again.
+void LoadedWindowing::load() {
     std::error_code error;
-    for (const auto& file : _modules)
-        if (std::filesystem::exists(file, error)) return windowingOf(file);
-    kLog.error("the windows' module {} is not installed", std::string(kModule));
-    return nullptr;
+    const auto file = std::ranges::find_if(
+        _modules, [&](const auto& each) { return std::filesystem::exists(each, error); });
+    if (file == _modules.end())
+        return kLog.error("the windows' module {} is not installed", std::string(kModule));
+
+    void* module = dlopen(file->c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (module) {
+        _runLoop = entry<RunLoopEntry>(module, kRunLoopEntry);
+        _endLoop = entry<EndLoopEntry>(module, kEndLoopEntry);
+        if (auto* windowing = entry<WindowingEntry>(module, kWindowingEntry))
+            _loaded = _runLoop && _endLoop ? windowing() : nullptr;
+    }
+    if (!_loaded)
+        kLog.error("loading the windows' module {}: {}", file->string(), std::string(dlerror()));
 }
 
-Windowing& Platform::windowing() {
+// A loop that was run before may have something due that its descriptor does not tell of yet.
+int LoadedWindowing::drive(MainLoop& loop) const {
+    DrivenLoop driven{loop, _endLoop, loop.dispatch()};
+    if (driven.ended) return *driven.ended;
+    _runLoop(loop.descriptor(), &DrivenLoop::dispatch, &driven);
+    return driven.ended.value_or(EXIT_FAILURE);
+}
+
+LoadedWindowing& loadedWindowing() {
     static auto& service = *new LoadedWindowing(installedModules());
     return service;
 }
+
+Windowing& Platform::windowing() { return loadedWindowing(); }
 
 }  // namespace vlm::platform

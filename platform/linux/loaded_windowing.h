@@ -9,7 +9,8 @@
 #include <memory>
 #include <vector>
 
-#include "platform/windowing.h"
+#include "platform/linux/main_loop.h"
+#include "platform/linux/windowing_module.h"
 
 namespace vlm::platform {
 
@@ -24,11 +25,23 @@ public:
     // Without a window there is nothing that could have the focus.
     void activateIgnoringOthers() override;
 
+    bool isLoaded() const { return _loaded != nullptr; }
+
+    // Lets the toolkit's loop drive this one, until this one ends; its status.
+    int drive(MainLoop& loop) const;
+
 private:
-    Windowing* loadModule() const;
+    void load();
 
     const std::vector<std::filesystem::path> _modules;
-    Windowing* _loaded = nullptr;  // lives as long as the process
+
+    // Of the module; they last as long as the process.
+    Windowing* _loaded = nullptr;
+    RunLoopEntry _runLoop = nullptr;
+    EndLoopEntry _endLoop = nullptr;
 };
+
+// The windows of this process, for the program that runs the toolkit's loop.
+LoadedWindowing& loadedWindowing();
 
 }  // namespace vlm::platform

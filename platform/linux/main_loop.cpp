@@ -49,6 +49,13 @@ int MainLoop::run() {
     return status < 0 ? EXIT_FAILURE : status;
 }
 
+std::optional<int> MainLoop::runWhile(const std::function<bool()>& goesOn) {
+    if (!_event) return EXIT_FAILURE;
+    while (!endedWith() && goesOn())
+        if (sd_event_run(_event.get(), UINT64_MAX) < 0) return EXIT_FAILURE;
+    return endedWith();
+}
+
 void MainLoop::end(int status) {
     add([this, status] { sd_event_exit(_event.get(), status); });
 }

@@ -35,8 +35,15 @@ public:
     // Until the end; the process's exit status.
     int run();
 
+    // The same, for as long as this answers true: it is asked before each turn. None when the loop
+    // has not ended then.
+    std::optional<int> runWhile(const std::function<bool()>& goesOn);
+
     // Ends the loop with this status, after the work that was handed in before.
     void end(int status);
+
+    // For what has descriptors and signals of its own on this loop; null when there is no loop.
+    sd_event* event() const { return _event.get(); }
 
     int descriptor() const;
 

@@ -14,6 +14,10 @@ inline constexpr const char* kNotificationsObject = "/org/vlm/vlmbind";
 inline constexpr const char* kNotificationsInterface = "org.vlm.Notifications";
 inline constexpr const char* kDeliverMethod = "Deliver";
 
+// The answer of a receiver that is about to end, to who waits for one: the next call reaches another
+// process.
+inline constexpr const char* kLeavingError = "org.vlm.Notifications.Error.Leaving";
+
 class SessionBusNotifications final : public Notifications {
 public:
     // How long the bus may take to answer and a receiver to come to it: a program with windows

@@ -25,18 +25,6 @@ protected:
     }
 };
 
-TEST_F(DialogControl, AgentModeSaysThatItIsNotAvailable) {
-    std::ostringstream output;
-    std::ostringstream complaints;
-    Console console(output, complaints);
-
-    EXPECT_EQ(runAgent(console), 255);
-
-    EXPECT_EQ(output.str(), "");
-    EXPECT_EQ(complaints.str(), "vlmbind: Agent mode is not available in this version.\n");
-    EXPECT_TRUE(complained("Agent mode is not available in this version."));
-}
-
 class PairingUi : public DialogControl {};
 
 TEST_F(PairingUi, StatusIsAlwaysPrinted) {
