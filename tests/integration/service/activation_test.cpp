@@ -9,6 +9,7 @@
 #include <sstream>
 
 #include "hints_machine.h"
+#include "platform/linux/session_bus_notifications.h"
 
 namespace vlm::test {
 namespace {
@@ -83,6 +84,17 @@ TEST(ActivationTest, NamesTheInstalledProgramAndItsUnit) {
         EXPECT_THAT(file, testing::ContainsRegex("\nExec=/.*/vlm/vlmhintsd --(system|user)\n"));
         EXPECT_THAT(file, HasSubstr("\nSystemdService=vlmhintsd.service\n"));
     }
+}
+
+TEST(ActivationTest, NamesTheAgentAndItsUnit) {
+    const std::string name = platform::kNotificationsService;
+    const auto file = content(std::filesystem::path(VLM_ACTIVATION_FILES) / (name + ".service"));
+
+    EXPECT_THAT(file, StartsWith("[D-BUS Service]\n"));
+    EXPECT_THAT(file, HasSubstr("\nName=" + name + "\n"));
+    // Without arguments it is the agent.
+    EXPECT_THAT(file, testing::ContainsRegex("\nExec=/[^ ]*/bin/vlmbind\n"));
+    EXPECT_THAT(file, HasSubstr("\nSystemdService=vlmbind.service\n"));
 }
 
 class PolicyTest : public testing::Test {
