@@ -104,6 +104,10 @@ class Desktop:
         program = "/usr/lib/vlm-lab/desktop/windows"
         return self.user(self._user_at_console(), program, *words).output
 
+    def press_keys(self, *keys: str) -> None:
+        """On the keyboard at the console, one after the other; xdotool's names."""
+        self.user(self._user_at_console(), "xdotool", "key", "--delay", "50", *keys)
+
     def wait_until(self, what: str, reached, seconds: float = PATIENCE_SECONDS):
         """The first answer of reached() that counts as true."""
         end = time.monotonic() + seconds
