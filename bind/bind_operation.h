@@ -147,11 +147,13 @@ private:
     bool mayPair() const;
     bool offersSomething() const;
     void watchTokens();
+    void dropWatcher();
     void checkForDialog();
     void handleInsertion(const std::string& token);
     void handleRemoval(const std::string& token);
 
     void makeDialog();
+    void showDialog(const std::shared_ptr<PairingDialog>& made);
     void refreshDialog();
     void closeDialog();
     void cancel();

@@ -108,11 +108,15 @@ void BindOperation::watchTokens() {
 void BindOperation::checkForDialog() {
     if (!_dialog.closeIfFree()) return;
     BindUtils::log().notice("token was removed before showing dialog");
-    // Letting go of a watcher waits for its handler, which may wait for a card.
+    dropWatcher();
+    report(BindResult::NotOffered, std::nullopt);
+}
+
+// Letting go of a watcher waits for its handler, which may wait for a card.
+void BindOperation::dropWatcher() {
     auto watcher = tokenWatcher();
     setTokenWatcher(nullptr);
     current().workQueues().runInBackground([dropped = std::move(watcher)] {});
-    report(BindResult::NotOffered, std::nullopt);
 }
 
 void BindOperation::handleInsertion(const std::string& token) {
@@ -146,9 +150,16 @@ void BindOperation::makeDialog() {
     auto made = _makeDialog ? _makeDialog(shared_from_this()) : nullptr;
     if (!made) return;
     _dialog.keep(made);
-    current().workQueues().runOnMain([self = shared_from_this(), dialog = std::move(made)] {
-        if (self->dialog() == dialog) dialog->showWindow();
-    });
+    current().workQueues().runOnMain(
+        [self = shared_from_this(), dialog = std::move(made)] { self->showDialog(dialog); });
+}
+
+// A dialog without a window has no button that could end the operation.
+void BindOperation::showDialog(const std::shared_ptr<PairingDialog>& made) {
+    if (dialog() != made || made->showWindow()) return;
+    BindUtils::log().error("the pairing dialog cannot be shown");
+    dropWatcher();
+    end(BindResult::NotOffered, std::nullopt);
 }
 
 void BindOperation::refreshDialog() {

@@ -19,7 +19,8 @@ class PairingDialog {
 public:
     virtual ~PairingDialog() = default;
 
-    virtual void showWindow() = 0;
+    // False when there is no window to show.
+    virtual bool showWindow() = 0;
     virtual void refreshIdentities() = 0;
     virtual void close() = 0;
 

@@ -32,7 +32,7 @@ public:
                                                          DialogActions actions);
 
     // PairingDialog:
-    void showWindow() override { WindowController::showWindow(); }
+    bool showWindow() override { return WindowController::showWindow(); }
     void refreshIdentities() override;
     void close() override { WindowController::close(); }
     void showAlert(const platform::Alert& alert, std::function<void()> dismissed) override;

@@ -15,8 +15,10 @@ platform::Window* WindowController::window() {
     return _window.get();
 }
 
-void WindowController::showWindow() {
-    if (auto* shown = window()) shown->makeKeyAndOrderFront();
+bool WindowController::showWindow() {
+    auto* shown = window();
+    if (shown) shown->makeKeyAndOrderFront();
+    return shown != nullptr;
 }
 
 // The window stays until the controller goes: it may be the one who asks.

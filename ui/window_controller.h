@@ -27,8 +27,8 @@ public:
     // Loaded now if it was not yet; null when that fails, and after close().
     platform::Window* window();
 
-    // In front of the others, with the keyboard's focus.
-    void showWindow();
+    // In front of the others, with the keyboard's focus; false when there is no window.
+    bool showWindow();
 
     // For good.
     void close();

@@ -11,21 +11,32 @@ namespace {
 
 constexpr Log kLog(kTokenFramework, "windowing");
 
-// The last is a screen that nobody sees: without it, the toolkit would end the process when it can
-// reach no other. X comes first, since only there a window can float above all others and choose
-// its place.
-constexpr const char* kScreens = "xcb;wayland;offscreen";
+// X comes first, since only there a window can float above all others and choose its place.
+constexpr const char* kScreens = "xcb;wayland";
+
+// A screen that nobody sees. It is tried last, also where the environment knows better than we do
+// what to try: the toolkit would end the process when it can reach no screen at all.
 constexpr const char* kNoScreen = "offscreen";
+
+std::string wantedScreens() {
+    const auto wanted = qgetenv("QT_QPA_PLATFORM").toStdString();
+    return wanted.empty() ? kScreens : wanted;
+}
 
 // The arguments have to last as long as the toolkit, which is for ever.
 void makeApplication() {
     static char program[] = "vlmbind";
     static char option[] = "-platform";
-    static std::string screens = kScreens;
+    static std::string screens = wantedScreens() + ';' + kNoScreen;
     static char* arguments[] = {program, option, screens.data(), nullptr};
     static int count = 3;
-    if (qEnvironmentVariableIsSet("QT_QPA_PLATFORM")) count = 1;  // somebody knows better
     new QApplication(count, arguments);
+}
+
+// Unseen by anybody but whoever asked for just that.
+bool isScreenReached() {
+    return QGuiApplication::platformName() != kNoScreen ||
+           wantedScreens().find(kNoScreen) != std::string::npos;
 }
 
 }  // namespace
@@ -36,8 +47,7 @@ bool QtWindowing::start() {
         QCoreApplication::installTranslator(&_texts);
         QApplication::setQuitOnLastWindowClosed(false);
     }
-    return QGuiApplication::platformName() != kNoScreen ||
-           qEnvironmentVariableIsSet("QT_QPA_PLATFORM");
+    return isScreenReached();
 }
 
 std::unique_ptr<Window> QtWindowing::loadWindow(std::string_view description) {

@@ -9,7 +9,7 @@ namespace {
 
 // Whoever shows dialogs is no part of these tests.
 class NoDialog final : public PairingDialog {
-    void showWindow() override {}
+    bool showWindow() override { return true; }
     void refreshIdentities() override {}
     void close() override {}
     void showAlert(const platform::Alert&, std::function<void()>) override {}

@@ -10,7 +10,7 @@ namespace vlm {
 namespace {
 
 class NoDialog final : public PairingDialog {
-    void showWindow() override {}
+    bool showWindow() override { return true; }
     void refreshIdentities() override {}
     void close() override {}
     void showAlert(const platform::Alert&, std::function<void()>) override {}

@@ -160,5 +160,36 @@ TEST_F(Insertion, AsksForTheDialogAgainThatCouldNotBeMade) {
     workQueues().runBackground();
 }
 
+TEST_F(Insertion, WithoutAWindowEndsTheOperationAndDropsTheWatcher) {
+    insertBlue();
+    tokens.present = {blue};
+    start();
+    ASSERT_EQ(events.take(), Happened{"make"});
+    dialog.lock()->hasWindow = false;
+
+    EXPECT_EQ(onMain(), (Happened{"show", "close", "report 3"}));
+
+    EXPECT_EQ(reportedError, std::nullopt);
+    EXPECT_TRUE(complained("the pairing dialog cannot be shown"));
+    EXPECT_TRUE(dialog.expired());
+    EXPECT_EQ(operation->tokenWatcher(), nullptr);
+    workQueues().runBackground();
+    EXPECT_TRUE(tokens.watcher.expired());
+    workQueues().advanceBy(30s);
+    EXPECT_EQ(onMain(), Happened()) << "it has ended already";
+}
+
+TEST_F(Insertion, WithoutAWindowEndsAlsoWhenMoreTokensCame) {
+    insertBlue();
+    insertRed();
+    tokens.present = {blue, red};
+    start();
+    ASSERT_EQ(events.take(), Happened{"make"});
+    dialog.lock()->hasWindow = false;
+
+    EXPECT_EQ(onMain(), (Happened{"show", "close", "report 3"}));
+    workQueues().runBackground();
+}
+
 }  // namespace
 }  // namespace vlm

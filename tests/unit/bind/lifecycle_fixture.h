@@ -41,7 +41,10 @@ public:
     SilentDialog(std::shared_ptr<BindOperation> operation, Events& events)
         : _operation(std::move(operation)), _events(events) {}
 
-    void showWindow() override { _events.add("show"); }
+    bool showWindow() override {
+        _events.add("show");
+        return hasWindow;
+    }
     void refreshIdentities() override { _events.add("refresh"); }
     void close() override { _events.add("close"); }
     void showAlert(const platform::Alert& shown, std::function<void()> dismissed) override {
@@ -50,6 +53,7 @@ public:
         dismiss = std::move(dismissed);
     }
 
+    bool hasWindow = true;
     std::optional<platform::Alert> alert;
     std::function<void()> dismiss;
 

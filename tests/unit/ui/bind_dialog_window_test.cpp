@@ -21,7 +21,7 @@ TEST_F(BindDialogWindow, IsNotLoadedBeforeItIsNeeded) {
 }
 
 TEST_F(BindDialogWindow, IsDressedAndShownInThisOrder) {
-    dialog->showWindow();
+    EXPECT_TRUE(dialog->showWindow());
 
     EXPECT_EQ(windowing().record,
               (Strings{"load BindDialog", "level 999", "centre", "key", "activate", "key"}));
@@ -82,7 +82,7 @@ TEST_F(BindDialogWindow, NeedsNoneOfItsParts) {
 TEST_F(BindDialogWindow, ThatCannotBeLoadedLeavesEverythingToBeAsked) {
     windowing().describe("BindDialog", nullptr);
 
-    dialog->showWindow();
+    EXPECT_FALSE(dialog->showWindow());
     dialog->refreshIdentities();
     dialog->setEnabled(false);
     dialog->setEnabled(true);

@@ -42,8 +42,8 @@ TEST_F(WindowControllerTest, LoadsItsWindowOnFirstUseAndOnce) {
 }
 
 TEST_F(WindowControllerTest, BringsItsWindowToTheFrontEachTime) {
-    controller.showWindow();
-    controller.showWindow();
+    EXPECT_TRUE(controller.showWindow());
+    EXPECT_TRUE(controller.showWindow());
 
     EXPECT_EQ(windowing().record, (Strings{"load Traced", "outlets", "loaded", "key", "key"}));
 }
@@ -51,6 +51,7 @@ TEST_F(WindowControllerTest, BringsItsWindowToTheFrontEachTime) {
 TEST_F(WindowControllerTest, TriesAgainToLoadAWindow) {
     windowing().describe("Traced", nullptr);
     EXPECT_EQ(controller.window(), nullptr);
+    EXPECT_FALSE(controller.showWindow());
 
     windowing().describe("Traced", [](fakes::FakeScreenWindow&) {});
     EXPECT_NE(controller.window(), nullptr);
@@ -60,7 +61,7 @@ TEST_F(WindowControllerTest, HasNoWindowOnceItIsClosed) {
     controller.showWindow();
 
     controller.close();
-    controller.showWindow();
+    EXPECT_FALSE(controller.showWindow());
 
     EXPECT_EQ(controller.window(), nullptr);
     EXPECT_FALSE(windowing().windows.at(0)->shown);
