@@ -15,6 +15,9 @@ namespace vlm::platform {
 // The framework's identifier: log subsystem and prefix of its service names.
 inline constexpr std::string_view kTokenFramework = "org.vlm.token";
 
+// The notification that a token was inserted; posted once for each token that comes.
+inline constexpr std::string_view kNewTokenNotification = "org.vlm.token.new-token";
+
 // The domain of the errors that the framework and its clients make.
 inline constexpr std::string_view VLErrorDomain = "VLErrorDomain";
 
