@@ -15,7 +15,7 @@ namespace vlm::platform {
 // The framework's identifier: log subsystem and prefix of its service names.
 inline constexpr std::string_view kTokenFramework = "org.vlm.token";
 
-// The notification that is posted when a token was inserted.
+// The notification that a token was inserted; posted once for each token that comes.
 inline constexpr std::string_view kNewTokenNotification = "org.vlm.token.new-token";
 
 // The domain of the errors that the framework and its clients make.

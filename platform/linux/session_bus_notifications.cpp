@@ -9,6 +9,7 @@
 
 #include "platform/linux/exchange_failure.h"
 #include "platform/linux/sd_bus_handles.h"
+#include "platform/linux/send_notification.h"
 #include "platform/platform.h"
 #include "platform/system_log.h"
 #include "platform/token_framework.h"
@@ -43,7 +44,6 @@ private:
     using Clock = std::chrono::steady_clock;
 
     int open();
-    int send(const std::string& name);
     int awaitReceiver();
     int ask(const char* method, std::optional<std::uint32_t> flags, SdBusMessage& answer);
     std::string failureOf(int result) const;
@@ -64,7 +64,7 @@ private:
 std::string Delivery::deliver(const std::string& name) {
     int result = open();
     if (result < 0) return _failures.noBus(noBusReason(result)).sentence;
-    result = send(name);
+    result = sendNotification(_bus.get(), name);
     if (result < 0) return _failures.cannotBeSent(systemText(result)).sentence;
     result = awaitReceiver();
     return result < 0 ? failureOf(result) : "";
@@ -85,18 +85,6 @@ int Delivery::open() {
     // What nobody takes must not be flushed.
     if (result < 0 && opened != nullptr) sd_bus_close(opened);
     return result;
-}
-
-int Delivery::send(const std::string& name) {
-    sd_bus_message* made = nullptr;
-    int result = sd_bus_message_new_method_call(_bus.get(), &made, kNotificationsService,
-                                                kNotificationsObject, kNotificationsInterface,
-                                                kDeliverMethod);
-    const SdBusMessage delivery(made);
-    if (result >= 0) result = sd_bus_message_append_basic(made, 's', name.c_str());
-    // Nothing comes back, so what the receiver does with it is not waited for.
-    if (result >= 0) result = sd_bus_message_set_expect_reply(made, 0);
-    return result < 0 ? result : sd_bus_send(_bus.get(), made, nullptr);
 }
 
 // A bus drops what waits for a program to start when the sender leaves before that, and says

@@ -63,7 +63,7 @@ int BusTokenWatches::watch(sd_bus_message* call) {
                                      [this, who = caller->connection] { leave(who); });
     // It has left already.
     if (!watch) return leave(caller->connection), 1;
-    startLooking();
+    _parts.lookout.setWatched(true);
     if (_isKnown)
         answer(call);
     else
@@ -76,25 +76,11 @@ void BusTokenWatches::leave(const std::string& connection) {
     if (!_watchers.empty()) return;
     _waiting.clear();
     _isKnown = false;
-    _looking.reset();
+    _parts.lookout.setWatched(false);
 }
 
-void BusTokenWatches::startLooking() {
-    if (_looking) return;
-    TokenLookout::Parts parts{
-        .daemon = _parts.daemon,
-        .callAfter =
-            [event = _parts.event](TokenLookout::Duration delay, std::function<void()> call) {
-                return std::shared_ptr<void>(callAfter(event, delay, std::move(call)));
-            },
-        .inserted = [this](const std::string& token) { tell("Inserted", token); },
-        .removed = [this](const std::string& token) { tell("Removed", token); },
-        .looked = [this] { answerThoseWhoWait(); }};
-    _looking.emplace(_parts.event, std::move(parts));
-}
-
-void BusTokenWatches::answerThoseWhoWait() {
-    _isKnown = true;
+void BusTokenWatches::looked() {
+    _isKnown = !_watchers.empty();
     for (const auto& call : std::exchange(_waiting, {})) answer(call.get());
 }
 
@@ -103,7 +89,7 @@ void BusTokenWatches::answer(sd_bus_message* call) {
     if (sd_bus_message_new_method_return(call, &made) < 0) return;
     const platform::SdBusMessage reply(made);
     int result = sd_bus_message_open_container(made, 'a', "s");
-    for (const auto& token : _looking->lookout.tokens())
+    for (const auto& token : _parts.lookout.tokens())
         if (result >= 0) result = sd_bus_message_append_basic(made, 's', token.c_str());
     if (result >= 0) result = sd_bus_message_close_container(made);
     if (result >= 0) sd_bus_send(_parts.bus, made, nullptr);

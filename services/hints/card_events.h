@@ -1,14 +1,15 @@
-// CardEvents: tells when a card or a reader comes or goes, as pcscd knows it.
+// CardEvents: tells when a card or a reader comes or goes, as pcscd knows it, and when pcscd itself
+// does.
 //
-// PC/SC waits in calls that block, so a thread of its own does. While no card moves and pcscd runs,
-// nothing wakes it; a pcscd that is not there is looked for after pauses that grow up to half a
-// minute.
+// PC/SC waits in calls that block, so a thread of its own does. While no card moves, nothing wakes
+// it. A pcscd that cannot be reached is tried again a few times, after pauses that grow, and from
+// then on when its socket is made anew, or on demand.
 //
 // Ownership: the loop outlives it. It may be destroyed by what it calls.
 // Threads:   the event loop's; the handler is called there.
 // Blocking:  going takes as long as pcscd needs to hear of it, a second at most.
 // Errors:    a machine without pcscd has no card events; the log says so once, as an information.
-// In tests:  tests/lab/scenarios/watcher.py
+// In tests:  tests/lab/scenarios/watcher.py, tests/lab/scenarios/new_token.py
 
 #pragma once
 
@@ -21,12 +22,19 @@
 
 namespace vlm::service {
 
+// What has happened; a coming or going of pcscd may have cards of its readers come or go with it.
+enum class CardEvent { CardMoved, PcscdCame, PcscdWent };
+
 class CardEvents {
 public:
-    CardEvents(sd_event* event, std::function<void()> changed);
+    CardEvents(sd_event* event, std::function<void(CardEvent)> happened);
     ~CardEvents();
     CardEvents(const CardEvents&) = delete;
     CardEvents& operator=(const CardEvents&) = delete;
+
+    // The user has come to the console, or something else has changed that pcscd may go by when it
+    // decides whom to serve.
+    void tryPcscdAgain();
 
 private:
     class Waiter;

@@ -64,10 +64,16 @@ void TokenLookout::cardEvent() {
     if (!_call) look();
 }
 
+void TokenLookout::setWatched(bool isWatched) {
+    if (isWatched && !_isWatched) cardEvent();
+    _isWatched = isWatched;
+}
+
 void TokenLookout::look() {
     if (std::exchange(_isEventNew, false)) {
         _needsSecondLook = true;
         _looksAtASlowCard = 0;
+        _triesInVain = 0;
         _slowPause.reset();
     } else {
         _needsSecondLook = false;
@@ -86,15 +92,19 @@ void TokenLookout::take(const Outcome<platform::Message>& outcome) {
     auto tokens = tokensIn(*outcome);
     if (!tokens) return failed({status::kUnreachable, "The daemon's answer cannot be understood."});
     _failurePause.reset();
+    _triesInVain = 0;
     if (std::exchange(_isFailing, false)) kLog.notice("the daemon tells the inserted cards again");
+    const auto lookAgain = lookAgainIn(*outcome);
+    _isCertain = !_isEventNew && !_needsSecondLook && lookAgain != LookAgain::Soon;
     tellDifferences(std::move(*tokens));
-    planNextLook(lookAgainIn(*outcome));
+    planNextLook(lookAgain);
 }
 
 void TokenLookout::failed(const Refusal& refusal) {
+    _isCertain = false;
     if (!std::exchange(_isFailing, true))
         kLog.error("the inserted cards are not known: {} ({})", refusal.text, refusal.status);
-    lookAfter(_failurePause.next());
+    if (_isWatched || _triesInVain++ < kMostTriesUnwatched) lookAfter(_failurePause.next());
 }
 
 void TokenLookout::tellDifferences(Tokens now) {
@@ -114,7 +124,7 @@ void TokenLookout::planNextLook(LookAgain lookAgain) {
         return lookAfter(_slowPause.next());
     }
     if (_needsSecondLook) return lookAfter(kUntilSecondLook);
-    if (lookAgain == LookAgain::NowAndThen) lookAfter(kNowAndThen);
+    if (lookAgain == LookAgain::NowAndThen && _isWatched) lookAfter(kNowAndThen);
 }
 
 void TokenLookout::lookAfter(Duration pause) {

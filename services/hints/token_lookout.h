@@ -3,9 +3,11 @@
 // It looks when it is made, when a card event comes, and a second after that once more: the first
 // answer may be from a reading that began before the event. While the daemon says that a card is
 // being read, it looks again after pauses that grow, a bounded number of times; a card that takes
-// longer is given up until the next event. Where a token may come unannounced, it looks now and
-// then. A daemon that cannot be reached is tried again without an end. Otherwise it waits, and
-// nothing wakes it.
+// longer is given up until the next event. Otherwise it waits, and nothing wakes it.
+//
+// While somebody watches, it does more: where a token may come unannounced, it looks now and then,
+// and a daemon that cannot be reached is tried again without an end. While nobody does, such a
+// daemon is given up as a slow card is.
 //
 // Ownership: its parts outlive it. It may not be destroyed by what it calls.
 // Threads:   the event loop's. Blocking: never.
@@ -48,6 +50,7 @@ public:
     static constexpr Duration kLongestPause = std::chrono::seconds(4);
     // With the five seconds that each may take, longer than the daemon lets a card be read.
     static constexpr int kMostLooksAtASlowCard = 10;
+    static constexpr int kMostTriesUnwatched = 10;
     static constexpr Duration kNowAndThen = std::chrono::seconds(2);
 
     explicit TokenLookout(Parts parts);
@@ -57,8 +60,15 @@ public:
     // Those that were told as inserted and not yet as removed.
     const Tokens& tokens() const { return _tokens; }
 
+    // Whether the tokens are all that are in: no card was being read at the last look, and no
+    // second look is to come.
+    bool isCertain() const { return _isCertain; }
+
     // A card or a reader has come or gone.
     void cardEvent();
+
+    // Somebody begins to watch, and it looks, for what came unannounced; or nobody does any more.
+    void setWatched(bool isWatched);
 
 private:
     void look();
@@ -75,7 +85,10 @@ private:
 
     bool _isEventNew = true;  // and the look that is under way, if any, may not show it
     bool _needsSecondLook = false;
+    bool _isWatched = false;
+    bool _isCertain = false;
     int _looksAtASlowCard = 0;
+    int _triesInVain = 0;
     platform::GrowingPause _slowPause{kUntilSecondLook, kLongestPause};
     platform::GrowingPause _failurePause;
     bool _isFailing = false;

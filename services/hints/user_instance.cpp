@@ -2,7 +2,6 @@
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_daemon_link.h"
 #include "services/hints/bus_server.h"
-#include "services/hints/bus_token_watches.h"
 #include "services/hints/desktop_pin_prompt.h"
 #include "services/hints/forwarding_service.h"
 #include "services/hints/hints_log.h"
@@ -10,6 +9,7 @@
 #include "services/hints/pin_asking.h"
 #include "services/hints/prompter_registration.h"
 #include "services/hints/service_names.h"
+#include "services/hints/session_tokens.h"
 
 namespace vlm::service {
 
@@ -47,8 +47,8 @@ InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
     BusDaemonLink daemon(loop.get());
     ForwardingService service(daemon, callers);
     BusServer server(connection, kHintsInterface, "Exchange", service);
-    BusTokenWatches watches({loop.get(), connection, callers, daemon});
-    if (!server.start() || !watches.start()) return {"the bus does not take the service"};
+    SessionTokens tokens({loop.get(), connection, callers, daemon});
+    if (!server.start() || !tokens.start()) return {"the bus does not take the service"};
 
     // Without a system bus there is no daemon that could ask; requests say so themselves.
     const auto systemBus =

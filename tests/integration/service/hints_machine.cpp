@@ -146,6 +146,8 @@ Child::Options HintsMachine::options(std::optional<uid_t> user) const {
     options.user = user;
     options.environment = {{"DBUS_SYSTEM_BUS_ADDRESS", _systemBus.address()},
                            {"DBUS_SESSION_BUS_ADDRESS", _sessionBus.address()},
+                           // The readers of the machine that runs the test are no part of it.
+                           {"PCSCLITE_CSOCK_NAME", _folder.path() / "pcscd.comm"},
                            {"VLM_LOG_TARGET", "stderr"},
                            {"DISPLAY", std::nullopt},
                            {"WAYLAND_DISPLAY", std::nullopt}};

@@ -31,6 +31,11 @@ protected:
         reply.set("num1", static_cast<std::int64_t>(lookAgain));
         daemon.answer(std::move(reply));
     }
+    // The look that was under way is answered, and the one for the watcher has begun.
+    void beWatched() {
+        lookout.setWatched(true);
+        if (daemon.requests.size() == 1) answer({});
+    }
     void refuse() { daemon.answer(Refusal{status::kUnreachable, "nobody is there"}); }
 
     void advanceBy(std::chrono::milliseconds time) {
@@ -156,7 +161,89 @@ TEST_F(TokenLookoutTest, StopsLookingWhenTheCardIsRead) {
     EXPECT_FALSE(isTimerArmed());
 }
 
+TEST_F(TokenLookoutTest, LooksWhenSomebodyBeginsToWatch) {
+    answer({});
+    skipPause();
+    answer({}, LookAgain::NowAndThen);
+    ASSERT_FALSE(isLooking());
+
+    lookout.setWatched(true);
+    ASSERT_TRUE(isLooking());
+    answer({"unannounced"});
+
+    EXPECT_THAT(told, ElementsAre("+unannounced"));
+}
+
+TEST_F(TokenLookoutTest, LooksOnlyOnEventsWhileNobodyWatches) {
+    answer({}, LookAgain::NowAndThen);
+    EXPECT_EQ(skipPause(), 1s);
+    answer({}, LookAgain::NowAndThen);
+    EXPECT_FALSE(isTimerArmed());
+
+    beWatched();
+    answer({}, LookAgain::NowAndThen);
+    skipPause();
+    answer({}, LookAgain::NowAndThen);
+    EXPECT_EQ(skipPause(), 2s);
+    lookout.setWatched(false);
+    answer({}, LookAgain::NowAndThen);
+
+    EXPECT_FALSE(isTimerArmed());
+    EXPECT_FALSE(isLooking());
+}
+
+TEST_F(TokenLookoutTest, GivesADaemonThatIsAwayUpUntilTheNextEventWhileNobodyWatches) {
+    refuse();
+    for (int tries = 0; tries < TokenLookout::kMostTriesUnwatched; ++tries) {
+        ASSERT_GT(skipPause(), 0ms);
+        refuse();
+    }
+    EXPECT_FALSE(isTimerArmed());
+
+    lookout.cardEvent();
+
+    EXPECT_TRUE(isLooking());
+    refuse();
+    EXPECT_TRUE(isTimerArmed());
+}
+
+TEST_F(TokenLookoutTest, IsCertainWhenNoLookIsToCome) {
+    answer({});
+    EXPECT_FALSE(lookout.isCertain()) << "the second look may show more";
+    skipPause();
+    answer({});
+    EXPECT_TRUE(lookout.isCertain());
+
+    lookout.cardEvent();
+    answer({"a"});
+    EXPECT_FALSE(lookout.isCertain());
+    skipPause();
+    answer({"a"}, LookAgain::Soon);
+    EXPECT_FALSE(lookout.isCertain()) << "a card is being read";
+    skipPause();
+    lookout.cardEvent();
+    answer({"a"});
+    EXPECT_FALSE(lookout.isCertain()) << "a card has moved since";
+    answer({"a"});
+    skipPause();
+    answer({"a"}, LookAgain::NowAndThen);
+    EXPECT_TRUE(lookout.isCertain());
+}
+
+TEST_F(TokenLookoutTest, IsNotCertainOfWhatTheDaemonDoesNotTell) {
+    answer({"a"});
+    skipPause();
+    answer({"a"});
+    ASSERT_TRUE(lookout.isCertain());
+
+    lookout.cardEvent();
+    refuse();
+
+    EXPECT_FALSE(lookout.isCertain());
+}
+
 TEST_F(TokenLookoutTest, LooksNowAndThenWhereNothingIsAnnounced) {
+    beWatched();
     answer({}, LookAgain::NowAndThen);
     skipPause();
     for (int i = 0; i < 10; ++i) {
@@ -171,15 +258,16 @@ TEST_F(TokenLookoutTest, LooksNowAndThenWhereNothingIsAnnounced) {
 }
 
 TEST_F(TokenLookoutTest, KeepsWhatItKnowsAndTriesWithoutAnEndWhenTheDaemonIsAway) {
+    beWatched();
     answer({"a"});
     skipPause();
 
-    for (const auto pause : {1s, 2s, 4s, 8s, 16s, 30s, 30s, 30s}) {
+    for (const auto pause : {1s, 2s, 4s, 8s, 16s, 30s, 30s, 30s, 30s, 30s, 30s, 30s}) {
         refuse();
         EXPECT_EQ(skipPause(), pause);
     }
     EXPECT_THAT(told, ElementsAre("+a"));
-    EXPECT_EQ(timesLooked, 9);
+    EXPECT_EQ(timesLooked, 14);
     EXPECT_EQ(log().texts(platform::LogLevel::Error).size(), 1u);
     answer({});
 

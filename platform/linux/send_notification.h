@@ -1,0 +1,14 @@
+#pragma once
+
+#include <systemd/sd-bus.h>
+
+#include <string>
+
+namespace vlm::platform {
+
+// Queues one notification on a connection to the session bus. The connection has to stay: a bus
+// drops what it holds for a program that it is just starting when the sender leaves. Below zero, as
+// sd-bus has it, when that cannot be done. In tests: tests/integration/notifications/
+int sendNotification(sd_bus* bus, const std::string& name);
+
+}  // namespace vlm::platform

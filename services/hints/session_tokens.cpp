@@ -1,0 +1,59 @@
+#include "services/hints/session_tokens.h"
+
+#include <cstring>
+#include <functional>
+#include <memory>
+#include <string>
+#include <utility>
+
+#include "platform/linux/send_notification.h"
+#include "platform/token_framework.h"
+#include "services/hints/hints_log.h"
+
+namespace vlm::service {
+
+namespace {
+
+auto callingAfter(sd_event* event) {
+    return [event](std::chrono::milliseconds delay, std::function<void()> call) {
+        return std::shared_ptr<void>(callAfter(event, delay, std::move(call)));
+    };
+}
+
+void postNewToken(sd_bus* bus) {
+    const int result =
+        platform::sendNotification(bus, std::string(platform::kNewTokenNotification));
+    if (result < 0)
+        kLog.error("the notification {} cannot be sent: {}", platform::kNewTokenNotification,
+                   std::strerror(-result));
+}
+
+}  // namespace
+
+SessionTokens::SessionTokens(const Parts& parts)
+    : _watches({parts.bus, parts.callers, _lookout}),
+      _notice({.isUserAtConsole = isUserAtConsole,
+               .post = [bus = parts.bus] { postNewToken(bus); },
+               .callAfter = callingAfter(parts.event)}),
+      _lookout({.daemon = parts.daemon,
+                .callAfter = callingAfter(parts.event),
+                .inserted = [this](const std::string& token) { _watches.inserted(token); },
+                .removed = [this](const std::string& token) { _watches.removed(token); },
+                .looked =
+                    [this] {
+                        _watches.looked();
+                        _notice.looked(_lookout.tokens(), _lookout.isCertain());
+                    }}),
+      _cards(parts.event, [this](CardEvent event) { cardEvent(event); }),
+      _console(parts.event, [this] {
+          _notice.consoleChanged();
+          _cards.tryPcscdAgain();
+      }) {}
+
+void SessionTokens::cardEvent(CardEvent event) {
+    if (event == CardEvent::PcscdWent) _notice.pcscdWent();
+    if (event == CardEvent::PcscdCame) _notice.pcscdCame();
+    _lookout.cardEvent();
+}
+
+}  // namespace vlm::service
