@@ -17,6 +17,10 @@ std::string field(const CK_UTF8CHAR (&padded)[size]) {
     return {reinterpret_cast<const char*>(padded), size};
 }
 
+// One thread calls, and says so: without locks a module cannot lock itself out, as one does when its
+// card is pulled while it is read.
+CK_RV initialize(CK_FUNCTION_LIST* module) { return module->C_Initialize(nullptr); }
+
 }  // namespace
 
 std::string resultText(CK_RV result) {
@@ -26,13 +30,14 @@ std::string resultText(CK_RV result) {
 }
 
 std::unique_ptr<Pkcs11Module> Pkcs11Module::load(const std::string& path, std::string* reason) {
-    CK_FUNCTION_LIST* module = p11_kit_module_load(path.c_str(), P11_KIT_MODULE_CRITICAL);
+    CK_FUNCTION_LIST* module =
+        p11_kit_module_load(path.c_str(), P11_KIT_MODULE_CRITICAL | P11_KIT_MODULE_UNMANAGED);
     if (module == nullptr) {
         const char* message = p11_kit_message();
         *reason = "it cannot be loaded: " + cardText(message == nullptr ? path : message);
         return nullptr;
     }
-    const CK_RV result = p11_kit_module_initialize(module);
+    const CK_RV result = initialize(module);
     if (result != CKR_OK) {
         p11_kit_module_release(module);
         *reason = "it cannot be initialised: " + resultText(result);
@@ -42,13 +47,13 @@ std::unique_ptr<Pkcs11Module> Pkcs11Module::load(const std::string& path, std::s
 }
 
 Pkcs11Module::~Pkcs11Module() {
-    p11_kit_module_finalize(_module);
+    _module->C_Finalize(nullptr);
     p11_kit_module_release(_module);
 }
 
 void Pkcs11Module::reinitialize() {
-    p11_kit_module_finalize(_module);
-    p11_kit_module_initialize(_module);
+    _module->C_Finalize(nullptr);
+    initialize(_module);
 }
 
 std::optional<std::vector<CK_SLOT_ID>> Pkcs11Module::slots(bool withToken) const {

@@ -1,7 +1,7 @@
 """The pairing window: who gets it, what it offers while cards come and go, and how it is used."""
 
 from machine.checks import check
-from machine.listing import pair, present
+from machine.listing import only_identity, pair, present
 
 TITLE = "dialog: SmartCard Pairing"
 ALICE, CAROL = "Alice Archer", "Carol Cooper"
@@ -47,8 +47,7 @@ def the_last_card_takes_the_window_with_it(lab):
 
 
 def a_card_that_cannot_unlock_a_keyring_is_not_offered(lab):
-    lab.insert("no-wrap-key")
-    _ask_for_window(lab)
+    _insert(lab, "no-wrap-key")
 
     _wait_for_line(lab, "no unpaired identities found")
     _wait_for_end(lab)
@@ -67,24 +66,24 @@ def a_card_that_cannot_unlock_a_keyring_adds_nothing(lab):
 
 
 def an_expired_card_is_not_offered(lab):
-    lab.insert("expired")
-    _ask_for_window(lab)
+    _insert(lab, "expired")
 
     _wait_for_line(lab, "no unpaired identities found")
     _wait_for_end(lab)
 
 
 def without_a_card_there_is_no_window(lab):
-    _ask_for_window(lab)
+    lab.user("alice", "vlmbind", "-f")
 
     _wait_for_line(lab, "no unpaired identities found")
     _wait_for_end(lab)
 
 
 def a_card_pulled_before_it_could_be_shown_is_not_waited_for_longer_than_half_a_minute(lab):
-    lab.insert("rsa")
     _pull_between_listing_and_watching(lab)
-    _ask_for_window(lab)
+    _insert(lab, "rsa")
+    only_identity(lab, ALICE)
+    lab.user("alice", "vlmbind", "-f")
     _wait_for_line(lab, "all unmatched identities: ")
 
     _wait_for_line(lab, "token was removed before showing dialog", 40)
@@ -95,8 +94,7 @@ def a_card_pulled_before_it_could_be_shown_is_not_waited_for_longer_than_half_a_
 
 def a_guest_is_offered_nothing(lab):
     _be_at_the_console(lab, "guest")
-    lab.insert("rsa")
-    _ask_for_window(lab, "guest")
+    _insert(lab, "rsa", before="guest")
 
     _wait_for_line(lab, "current user is guest account")
     _wait_for_end(lab, "guest")
@@ -106,8 +104,7 @@ def a_guest_is_offered_nothing(lab):
 def the_account_that_sets_up_a_machine_is_offered_nothing(lab):
     lab.root("useradd", "--create-home", "--shell", "/bin/bash", "gnome-initial-setup")
     _be_at_the_console(lab, "gnome-initial-setup")
-    lab.insert("rsa")
-    _ask_for_window(lab, "gnome-initial-setup")
+    _insert(lab, "rsa", before="gnome-initial-setup")
 
     _wait_for_line(lab, "invalid current user: gnome-initial-setup")
     _wait_for_end(lab, "gnome-initial-setup")
@@ -117,9 +114,8 @@ def the_account_that_sets_up_a_machine_is_offered_nothing(lab):
 def who_is_not_at_the_console_is_offered_nothing(lab):
     lab.root("systemctl", "start", "console@bob")
     lab.root("loginctl", "activate", _session_of(lab, "alice"))
-    _log_everything(lab, "bob")
-    lab.insert("rsa")
-    _ask_for_window(lab, "bob")
+    _insert(lab, "rsa", before="bob")
+    lab.user("bob", "vlmbind", "-f")
 
     _wait_for_line(lab, "User 'bob' is not in active session")
     _wait_for_end(lab, "bob")
@@ -127,10 +123,9 @@ def who_is_not_at_the_console_is_offered_nothing(lab):
 
 
 def who_is_paired_is_offered_nothing_where_one_card_is_the_rule(lab):
-    pair(lab, "alice", present(lab, "rsa", ALICE))
+    _pair_alice(lab)
     lab.root("vlmctl", "set", "oneCardPerUser", "true")
-    lab.insert("second", 2)
-    _ask_for_window(lab)
+    _insert(lab, "second", 2)
 
     _wait_for_line(lab, "Cannot pair user which is already paired")
     _wait_for_end(lab)
@@ -138,10 +133,21 @@ def who_is_paired_is_offered_nothing_where_one_card_is_the_rule(lab):
 
 
 def who_is_paired_is_offered_a_second_card_otherwise(lab):
-    pair(lab, "alice", present(lab, "rsa", ALICE))
+    _pair_alice(lab)
+
     _offer(lab, "second", reader=2)
 
     check.assertEqual(_offered(lab), [CAROL])
+
+
+def a_card_that_is_paired_already_is_not_offered(lab):
+    _pair_alice(lab)
+    lab.remove()
+
+    _insert(lab, "rsa")
+
+    _wait_for_line(lab, "no unpaired identities found")
+    _wait_for_end(lab)
 
 
 def it_is_above_the_others_in_the_middle_and_has_the_focus(lab):
@@ -218,19 +224,23 @@ def closing_the_window_cancels(lab):
     _check_said(lab, "vlm bind canceled")
 
 
-def _log_everything(lab, user: str) -> None:
-    lab.user(user, "systemctl", "--user", "set-environment", "VLM_LOG_LEVEL=debug")
-
-
-def _ask_for_window(lab, user: str = "alice") -> None:
-    _log_everything(lab, user)
-    lab.user(user, "vlmbind", "-f")
+def _insert(lab, card: str, reader: int = 1, before: str = "alice") -> None:
+    """Before the eyes of a user at the console, for whom the agent will log everything."""
+    lab.user(before, "systemctl", "--user", "set-environment", "VLM_LOG_LEVEL=debug")
+    lab.insert(card, reader)
 
 
 def _offer(lab, card: str, reader: int = 1) -> None:
-    lab.insert(card, reader)
-    _ask_for_window(lab)
-    lab.wait_until("the window is there", lambda: TITLE in lab.windows(), 30)
+    _insert(lab, card, reader)
+    lab.wait_until("the window is there", lambda: TITLE in lab.windows())
+
+
+def _pair_alice(lab) -> None:
+    """From a shell, without a window meanwhile."""
+    lab.user("alice", "vlmbind", "-s", "disable")
+    done = pair(lab, "alice", present(lab, "rsa", ALICE))
+    check.assertEqual(done.status, 0, done)
+    lab.user("alice", "vlmbind", "-s", "enable")
 
 
 def _offered(lab) -> list[str]:

@@ -19,7 +19,7 @@ public:
     explicit QuietDialog(std::shared_ptr<BindOperation> operation)
         : _operation(std::move(operation)) {}
 
-    void showWindow() override {}
+    bool showWindow() override { return true; }
     void refreshIdentities() override {}
     void close() override {}
     void showAlert(const platform::Alert&, std::function<void()> dismissed) override {
