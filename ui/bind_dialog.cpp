@@ -53,6 +53,11 @@ void BindDialog::windowDidLoad() {
     platform::current().windowing().activateIgnoringOthers();
 }
 
+// Loading it brings it to the front already.
+bool BindDialog::showWindow() {
+    return isWindowLoaded() ? WindowController::showWindow() : window() != nullptr;
+}
+
 void BindDialog::refreshIdentities() {
     if (!_identityPopup) return;
     _identityPopup->removeAllItems();

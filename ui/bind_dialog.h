@@ -32,7 +32,7 @@ public:
                                                          DialogActions actions);
 
     // PairingDialog:
-    bool showWindow() override { return WindowController::showWindow(); }
+    bool showWindow() override;
     void refreshIdentities() override;
     void close() override { WindowController::close(); }
     void showAlert(const platform::Alert& alert, std::function<void()> dismissed) override;

@@ -27,6 +27,8 @@ public:
     // Loaded now if it was not yet; null when that fails, and after close().
     platform::Window* window();
 
+    bool isWindowLoaded() const { return _window != nullptr; }
+
     // In front of the others, with the keyboard's focus; false when there is no window.
     bool showWindow();
 

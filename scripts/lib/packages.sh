@@ -11,7 +11,7 @@ demo_packages=(dbus opensc openssl p11-kit-modules softhsm2)
 
 test_packages=(
     gcovr git gnutls-bin libgmock-dev libgtest-dev mandoc p11-kit pinentry-tty procps
-    python3-cryptography systemd
+    python3-cryptography qt6-gtk-platformtheme systemd
     black clang clang-format clang-tidy libclang-rt-14-dev pyflakes3 shellcheck
 )
 

@@ -1,6 +1,6 @@
 // What platform/windowing.h promises, on the window that "BindDialog" describes. Verbs, which act
 // on the window that was loaded last: click(button), clickClose(), dismissSheet(); isShown(),
-// sheets().
+// sheets(). settle() has the toolkit do what it put off.
 
 #pragma once
 
@@ -221,6 +221,19 @@ TYPED_TEST_P(WindowingContract, GoesFromTheScreenWithItsOwner) {
 }
 
 TYPED_TEST_P(WindowingContract, MayBeLetGoByAClick) {
+    this->window->onClick("okButton", [&] {
+        this->window.reset();
+        ++this->calls;
+    });
+    this->show();
+
+    this->backend().click("okButton");
+
+    EXPECT_EQ(this->calls, 1);
+    EXPECT_FALSE(this->backend().isShown());
+}
+
+TYPED_TEST_P(WindowingContract, MayBeLetGoByItsCloseButton) {
     this->window->onClick("cancelButton", [&] {
         this->window.reset();
         ++this->calls;
@@ -246,6 +259,19 @@ TYPED_TEST_P(WindowingContract, MayBeLetGoByADismissal) {
     EXPECT_FALSE(this->backend().isShown());
 }
 
+TYPED_TEST_P(WindowingContract, CallsNothingOnceItWasLetGo) {
+    this->window->onClick("okButton", [&] { ++this->calls; });
+    this->show();
+    this->window->showSheet({platform::AlertStyle::Critical, "Failed", "", "OK"},
+                            [&] { ++this->calls; });
+
+    this->window.reset();
+    this->backend().settle();
+
+    EXPECT_EQ(this->calls, 0);
+    EXPECT_EQ(this->backend().sheets(), 0U);
+}
+
 REGISTER_TYPED_TEST_SUITE_P(WindowingContract, GivesNoWindowForAnUnknownDescription,
                             FindsPartsByTheirNamesAndKinds, ALoadedWindowIsNotShownYet,
                             ShowsTheFirstItemAppendedToAnEmptyPopUp,
@@ -257,6 +283,7 @@ REGISTER_TYPED_TEST_SUITE_P(WindowingContract, GivesNoWindowForAnUnknownDescript
                             ItsCloseButtonDoesNothingWhileThatOneIsDisabled,
                             CallsOnceWhenASheetIsDismissed, ClosesWithoutAnyClickOrDismissal,
                             IsHiddenForGood, GoesFromTheScreenWithItsOwner, MayBeLetGoByAClick,
-                            MayBeLetGoByADismissal);
+                            MayBeLetGoByItsCloseButton, MayBeLetGoByADismissal,
+                            CallsNothingOnceItWasLetGo);
 
 }  // namespace vlm::contracts

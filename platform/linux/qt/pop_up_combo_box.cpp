@@ -15,6 +15,11 @@ namespace {
 constexpr int kNarrowest = 24;
 constexpr int kWidest = 84;
 
+// Keep the direction of the window from what is inside: a bracket that lost its partner would go to
+// the other end of a name.
+constexpr QChar kIsolate(0x2068);
+constexpr QChar kEndOfIsolate(0x2069);
+
 }  // namespace
 
 PopUpComboBox::PopUpComboBox(QWidget* parent) : QComboBox(parent) {
@@ -32,20 +37,27 @@ QSize PopUpComboBox::minimumSizeHint() const {
     return {kNarrowest * fontMetrics().averageCharWidth(), QComboBox::minimumSizeHint().height()};
 }
 
-// The list may be wider than the button, but not than the screen.
+// The list may be wider than the button, but not than the screen. It begins where the button does,
+// unless it would reach over the edge.
 void PopUpComboBox::showPopup() {
+    const QRect available = screen()->availableGeometry();
     const int margins = 4 * fontMetrics().height();
     const int wanted = view()->sizeHintForColumn(0) + margins;
-    view()->setMinimumWidth(std::min(wanted, screen()->availableGeometry().width() / 2));
+    view()->setMinimumWidth(std::min(wanted, available.width() - margins));
     QComboBox::showPopup();
+
+    QWidget& list = *view()->window();
+    const QRect button(mapToGlobal(QPoint()), size());
+    const int begin = isRightToLeft() ? button.right() + 1 - list.width() : button.left();
+    const int furthest = std::max(available.left(), available.right() + 1 - list.width());
+    list.move(std::clamp(begin, available.left(), furthest), list.y());
 }
 
-// A tool tip interprets what looks like markup, and so gets titles in markup.
 bool PopUpComboBox::event(QEvent* event) {
     if (event->type() != QEvent::ToolTip) return QComboBox::event(event);
     const bool isWhole = elidedTitle() == currentText();
     const auto* help = static_cast<QHelpEvent*>(event);
-    const QString whole = "<span>" + currentText().toHtmlEscaped() + "</span>";
+    const QString whole = currentData(Qt::ToolTipRole).toString();
     QToolTip::showText(help->globalPos(), isWhole ? QString() : whole, this);
     return true;
 }
@@ -54,7 +66,7 @@ void PopUpComboBox::paintEvent(QPaintEvent*) {
     QStylePainter painter(this);
     QStyleOptionComboBox option;
     initStyleOption(&option);
-    option.currentText = elidedTitle();
+    option.currentText = kIsolate + elidedTitle() + kEndOfIsolate;
     painter.drawComplexControl(QStyle::CC_ComboBox, option);
     painter.drawControl(QStyle::CE_ComboBoxLabel, option);
 }

@@ -14,9 +14,16 @@ void QtPopUpButton::append(const MenuItem& item) {
     if (item.isSeparator)
         _box->insertSeparator(_box->count());
     else
-        _box->addItem(shownText(item.title));
+        addTitle(shownText(item.title));
     if (_items.size() == 1) _box->setCurrentIndex(0);  // also a separator
     _box->updateGeometry();
+}
+
+// A tool tip interprets what looks like markup, and so gets titles in markup.
+void QtPopUpButton::addTitle(const QString& title) {
+    _box->addItem(title);
+    _box->setItemData(_box->count() - 1, "<span>" + title.toHtmlEscaped() + "</span>",
+                      Qt::ToolTipRole);
 }
 
 std::optional<MenuItem> QtPopUpButton::selectedItem() const {

@@ -17,6 +17,8 @@ public:
     std::optional<MenuItem> selectedItem() const override;
 
 private:
+    void addTitle(const QString& title);
+
     QComboBox* const _box;
     std::vector<MenuItem> _items;  // as they came, in the box's order
 };

@@ -23,14 +23,27 @@ std::string wantedScreens() {
     return wanted.empty() ? kScreens : wanted;
 }
 
-// The arguments have to last as long as the toolkit, which is for ever.
-void makeApplication() {
-    static char program[] = "vlmbind";
-    static char option[] = "-platform";
-    static std::string screens = wantedScreens() + ';' + kNoScreen;
-    static char* arguments[] = {program, option, screens.data(), nullptr};
-    static int count = 3;
-    new QApplication(count, arguments);
+// A program's arguments, in the shape that the toolkit takes them.
+class Arguments {
+public:
+    explicit Arguments(std::vector<std::string> words)
+        : count(static_cast<int>(words.size())), _words(std::move(words)) {
+        for (auto& word : _words) _pointers.push_back(word.data());
+        _pointers.push_back(nullptr);
+    }
+    Arguments(const Arguments&) = delete;
+    Arguments& operator=(const Arguments&) = delete;
+
+    int count;
+    char** pointers() { return _pointers.data(); }
+
+private:
+    std::vector<std::string> _words;
+    std::vector<char*> _pointers;
+};
+
+std::vector<std::string> startOnAScreen() {
+    return {"vlmbind", "-platform", wantedScreens() + ';' + kNoScreen};
 }
 
 // Unseen by anybody but whoever asked for just that.
@@ -39,11 +52,25 @@ bool isScreenReached() {
            wantedScreens().find(kNoScreen) != std::string::npos;
 }
 
+// A theme that the environment names is loaded on any screen, also on the one that nobody sees, and
+// may end the process there. So a screen is looked for without that theme first.
+bool isScreenThereForTheme() {
+    if (qEnvironmentVariableIsEmpty("QT_QPA_PLATFORMTHEME")) return true;
+    auto words = startOnAScreen();
+    words.insert(words.end(), {"-platformtheme", "none"});
+    Arguments arguments(words);
+    const QGuiApplication trial(arguments.count, arguments.pointers());
+    return isScreenReached();
+}
+
 }  // namespace
 
 bool QtWindowing::start() {
     if (!qApp) {
-        makeApplication();
+        if (!isScreenThereForTheme()) return false;
+        // They have to last as long as the toolkit, which is for ever.
+        static auto& arguments = *new Arguments(startOnAScreen());
+        new QApplication(arguments.count, arguments.pointers());
         QCoreApplication::installTranslator(&_texts);
         QApplication::setQuitOnLastWindowClosed(false);
     }

@@ -23,6 +23,7 @@ public:
         QTest::mouseClick(box->defaultButton(), Qt::LeftButton);
     }
     bool isShown() { return test::bindDialog() && test::bindDialog()->isVisible(); }
+    void settle() { test::settle(); }
     std::size_t sheets() { return test::sheet() ? 1 : 0; }
 };
 

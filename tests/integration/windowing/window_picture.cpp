@@ -1,9 +1,10 @@
-// Draws the pairing window into a PNG: window_picture FILE [dark] [reverse] [long] [failed] [busy]
+// Draws the pairing window into a PNG: window_picture FILE [dark] [long] [opened] [failed] [busy]
 //
-// dark: in dark colours; reverse: from right to left; long: titles longer than the window;
-// failed: with the alert of a failed pairing; busy: while a card is at work.
+// dark: in dark colours; long: titles longer than the window; opened: with the list of identities
+// open; failed: with the alert of a failed pairing; busy: while a card is at work.
 
 #include <QApplication>
+#include <QComboBox>
 #include <QMessageBox>
 #include <QPainter>
 #include <QStyleFactory>
@@ -14,6 +15,7 @@
 
 #include "platform/localization.h"
 #include "platform/platform.h"
+#include "platform/text.h"
 #include "ui/bind_dialog.h"
 
 namespace vlm {
@@ -42,14 +44,19 @@ BindOperation::UnpairedIdentities identities(bool areLong) {
             {"red", {{{3}, "Bob Example"}}}};
 }
 
+// The window with what is open above it: a sheet, or the list of identities.
 QPixmap pictureOf(QWidget& window) {
-    QPixmap picture = window.grab();
-    const auto boxes = window.findChildren<QMessageBox*>();
-    for (auto* box : boxes) {
-        QPainter painter(&picture);
+    auto* list = QApplication::activePopupWidget();
+    const QRect whole = list ? window.geometry() | list->geometry() : window.geometry();
+    QPixmap picture(whole.size() * window.devicePixelRatioF());
+    picture.setDevicePixelRatio(window.devicePixelRatioF());
+    picture.fill(Qt::white);
+    QPainter painter(&picture);
+    painter.drawPixmap(window.geometry().topLeft() - whole.topLeft(), window.grab());
+    if (list) painter.drawPixmap(list->geometry().topLeft() - whole.topLeft(), list->grab());
+    for (auto* box : window.findChildren<QMessageBox*>()) {
         painter.fillRect(window.rect(), QColor(0, 0, 0, 110));
-        const QPoint corner = window.rect().center() - box->rect().center();
-        painter.drawPixmap(corner, box->grab());
+        painter.drawPixmap(window.rect().center() - box->rect().center(), box->grab());
     }
     return picture;
 }
@@ -65,19 +72,22 @@ int draw(const std::string& file, const Words& words) {
 
     QApplication::setStyle(QStyleFactory::create("Fusion"));
     if (wants("dark")) QApplication::setPalette(darkPalette());
-    if (wants("reverse")) QApplication::setLayoutDirection(Qt::RightToLeft);
     if (wants("busy")) dialog->setEnabled(false);
     if (wants("failed")) {
         auto& texts = platform::current().localization();
-        dialog->showAlert({platform::AlertStyle::Critical, "The pairing failed.",
-                           texts.text("SC_IS_ALREADY_PAIRED"), "OK"},
-                          [] {});
+        dialog->showAlert(
+            {platform::AlertStyle::Critical, texts.text("PAIRING_FAILED"),
+             platform::text(texts.text("PAIRING_ERROR"), texts.text("SC_IS_ALREADY_PAIRED")),
+             texts.text("OK")},
+            [] {});
     }
     dialog->window()->centre();
     QCoreApplication::processEvents();
-    for (auto* window : QApplication::topLevelWidgets())
-        if (window->objectName() == "BindDialog")
-            return pictureOf(*window).save(QString::fromStdString(file), "PNG") ? 0 : 1;
+    for (auto* window : QApplication::topLevelWidgets()) {
+        if (window->objectName() != "BindDialog") continue;
+        if (wants("opened")) window->findChild<QComboBox*>()->showPopup();
+        return pictureOf(*window).save(QString::fromStdString(file), "PNG") ? 0 : 1;
+    }
     return 1;
 }
 
@@ -87,7 +97,7 @@ int draw(const std::string& file, const Words& words) {
 int main(int argc, char* argv[]) {
     const vlm::Words words(argv + 1, argv + argc);
     if (words.empty()) {
-        std::cerr << "usage: window_picture FILE [dark] [reverse] [long] [failed] [busy]\n";
+        std::cerr << "usage: window_picture FILE [dark] [long] [opened] [failed] [busy]\n";
         return 2;
     }
     return vlm::draw(words.front(), words);

@@ -32,6 +32,7 @@ protected:
         environment.merge(Child::Environment{{"DBUS_SYSTEM_BUS_ADDRESS", machine.address()},
                                              {"DBUS_SESSION_BUS_ADDRESS", session.address()},
                                              {"QT_QPA_PLATFORM", std::nullopt},
+                                             {"QT_QPA_PLATFORMTHEME", std::nullopt},
                                              {"WAYLAND_DISPLAY", std::nullopt},
                                              {"DISPLAY", std::nullopt},
                                              {"VLM_LOG_TARGET", "stderr"}});
@@ -75,6 +76,14 @@ TEST_F(WithoutWindow, EndsWhenNoScreenAnswers) {
 TEST_F(WithoutWindow, EndsWhenTheScreenThatTheEnvironmentWantsIsNotThere) {
     for (const char* screen : {"xcb", "wayland;xcb", "nonesuch", ""})
         expectEnd(offer(builtProgram(), {{"QT_QPA_PLATFORM", screen}}), "there is no screen");
+}
+
+TEST_F(WithoutWindow, EndsAlsoUnderAThemeThatNeedsAScreen) {
+    if (!std::filesystem::exists(VLM_TOOLKITS_PLUGINS "/platformthemes/libqgtk3.so"))
+        GTEST_SKIP() << "the theme gtk3 is not installed (Debian: qt6-gtk-platformtheme)";
+    for (const char* display : {"", ":31999"})
+        expectEnd(offer(builtProgram(), {{"QT_QPA_PLATFORMTHEME", "gtk3"}, {"DISPLAY", display}}),
+                  "there is no screen");
 }
 
 TEST_F(WithoutWindow, EndsWhenTheModuleOfTheWindowsIsNotInstalled) {

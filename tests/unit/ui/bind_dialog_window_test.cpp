@@ -24,8 +24,25 @@ TEST_F(BindDialogWindow, IsDressedAndShownInThisOrder) {
     EXPECT_TRUE(dialog->showWindow());
 
     EXPECT_EQ(windowing().record,
-              (Strings{"load BindDialog", "level 999", "centre", "key", "activate", "key"}));
+              (Strings{"load BindDialog", "level 999", "centre", "key", "activate"}));
     EXPECT_TRUE(screen().shown);
+}
+
+TEST_F(BindDialogWindow, IsBroughtToTheFrontWhenItIsShownAgain) {
+    dialog->showWindow();
+    windowing().record.clear();
+
+    EXPECT_TRUE(dialog->showWindow());
+
+    EXPECT_EQ(windowing().record, Strings{"key"});
+}
+
+TEST_F(BindDialogWindow, ThatWasClosedIsNotShownAgain) {
+    dialog->showWindow();
+    dialog->close();
+
+    EXPECT_FALSE(dialog->showWindow());
+    EXPECT_FALSE(screen().shown);
 }
 
 TEST_F(BindDialogWindow, IsFilledWhenItIsLoaded) {

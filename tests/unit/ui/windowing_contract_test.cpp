@@ -14,6 +14,7 @@ public:
     void clickClose() { screen().clickClose(); }
     void dismissSheet() { screen().dismissSheet(); }
     bool isShown() { return screen().shown; }
+    void settle() {}
     std::size_t sheets() { return screen().sheets.size(); }
 
 private:
