@@ -12,6 +12,7 @@
 namespace vlm::platform {
 
 class Accounts;
+class Authorization;
 class ConsoleSessions;
 class Keychain;
 class Localization;
@@ -28,6 +29,7 @@ class WorkQueues;
 class Platform {
 public:
     Accounts& accounts();
+    Authorization& authorization();
     ConsoleSessions& consoleSessions();
     Keychain& keychain();
     Localization& localization();

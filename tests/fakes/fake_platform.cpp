@@ -22,6 +22,7 @@ FakePlatform::~FakePlatform() { installed = nullptr; }
 namespace vlm::platform {
 
 Accounts& Platform::accounts() { return *fakes::installed->accounts; }
+Authorization& Platform::authorization() { return *fakes::installed->authorization; }
 ConsoleSessions& Platform::consoleSessions() { return *fakes::installed->consoleSessions; }
 Keychain& Platform::keychain() { return *fakes::installed->keychain; }
 Localization& Platform::localization() { return *fakes::installed->localization; }

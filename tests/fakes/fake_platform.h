@@ -4,6 +4,7 @@
 #pragma once
 
 #include "fake_accounts.h"
+#include "fake_authorization.h"
 #include "fake_console_sessions.h"
 #include "fake_keychain.h"
 #include "fake_localization.h"
@@ -28,6 +29,7 @@ public:
 
     // The fakes, for a test to set up and to look at.
     FakeAccounts fakeAccounts;
+    FakeAuthorization fakeAuthorization;
     FakeConsoleSessions fakeConsoleSessions;
     FakeKeychain fakeKeychain;
     FakeLocalization fakeLocalization;
@@ -43,6 +45,7 @@ public:
 
     // What the code under test gets.
     platform::Accounts* accounts = &fakeAccounts;
+    platform::Authorization* authorization = &fakeAuthorization;
     platform::ConsoleSessions* consoleSessions = &fakeConsoleSessions;
     platform::Keychain* keychain = &fakeKeychain;
     platform::Localization* localization = &fakeLocalization;

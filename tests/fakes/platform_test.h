@@ -19,6 +19,7 @@ protected:
 
     FakePlatform& fakePlatform() { return _platform; }
     FakeAccounts& accounts() { return _platform.fakeAccounts; }
+    FakeAuthorization& authorization() { return _platform.fakeAuthorization; }
     FakeConsoleSessions& sessions() { return _platform.fakeConsoleSessions; }
     FakeKeychain& keychain() { return _platform.fakeKeychain; }
     FakeLocalization& localization() { return _platform.fakeLocalization; }
