@@ -13,6 +13,7 @@ namespace vlm::platform {
 
 class Accounts;
 class Application;
+class Authorization;
 class ConsoleSessions;
 class Keychain;
 class Localization;
@@ -30,6 +31,7 @@ class Platform {
 public:
     Accounts& accounts();
     Application& application();
+    Authorization& authorization();
     ConsoleSessions& consoleSessions();
     Keychain& keychain();
     Localization& localization();

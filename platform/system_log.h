@@ -1,7 +1,8 @@
 // SystemLog: where this system's log lines go, and Log, the handle that components write through.
 //
-// Shapes:    a record has a subsystem, a category, a level and one text (UTF-8; it may hold line
-//            feeds). Secrets never come here.
+// Shapes:    a record has a subsystem, a category, a level, one text (UTF-8; it may hold line
+// feeds)
+//            and, where there is one, the activity that it belongs to. Secrets never come here.
 // Threads:   any.
 // Blocking:  no; a line that cannot be delivered at once is lost.
 // Errors:    none are reported: logging never fails its caller.
@@ -24,6 +25,7 @@ struct LogRecord {
     std::string_view category;
     LogLevel level = LogLevel::Default;
     std::string_view text;
+    std::string_view activity = {};  // empty for none
 };
 
 class SystemLog {
@@ -35,6 +37,21 @@ public:
     virtual bool collects(LogLevel level) const = 0;
 
     virtual void write(const LogRecord& record) = 0;
+};
+
+// What this thread does while the object lives, and so what its lines are about: an event that came
+// in, a button that a person clicked. The inner one of two counts. Work that is handed to another
+// thread opens it there anew.
+class LogActivity {
+public:
+    // The name must outlive the object.
+    explicit LogActivity(std::string_view name);
+    ~LogActivity();
+    LogActivity(const LogActivity&) = delete;
+    LogActivity& operator=(const LogActivity&) = delete;
+
+private:
+    const std::string_view _outer;
 };
 
 // A component's handle on the log: one subsystem and one category. Made once per component.

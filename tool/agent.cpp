@@ -4,11 +4,12 @@
 #include <utility>
 
 #include "platform/platform.h"
+#include "platform/system_log.h"
 #include "platform/token_framework.h"
 #include "tool/exit_status.h"
-#include "tool/tool_identifier.h"
 #include "ui/bind_dialog.h"
 #include "util/bind_utils.h"
+#include "util/tool_identifier.h"
 
 namespace vlm {
 
@@ -27,21 +28,11 @@ void logEnd(BindResult result, const std::optional<platform::Error>& error) {
     log.debug("vlm bind finished with unknown result: {}", static_cast<std::int32_t>(result));
 }
 
-DialogActions dialogActions() {
-    using Operation = DialogActions::Operation;
-    const auto cancel = [](const Operation& operation) {
-        operation->finishWithResult(BindResult::Canceled, std::nullopt, std::nullopt);
-    };
-    return {[](const Operation& operation, const BindOperation::OptionalHash& hash) {
-                operation->finishWithResult(BindResult::Failed, hash, std::nullopt);
-            },
-            cancel, cancel};
-}
-
 }  // namespace
 
 void Agent::handleEvent(const std::string& notification) {
     if (notification != platform::kNewTokenNotification && notification != kForceBindUi) return;
+    const platform::LogActivity activity("new token notification");
     const auto bind = startedBind(notification);
     if (!bind) return;
     bind->startWithReply([agent = shared_from_this()](BindResult result,
@@ -97,9 +88,7 @@ void Agent::finish(BindResult result, const std::optional<platform::Error>& erro
 int runAgent() {
     const auto& log = BindUtils::log();
     log.debug("starting notify event handler");
-    const auto agent = std::make_shared<Agent>([](const std::shared_ptr<BindOperation>& operation) {
-        return BindDialog::initWithOperation(operation, dialogActions());
-    });
+    const auto agent = std::make_shared<Agent>(BindDialog::initWithOperation);
     current().application().setEventHandler(
         [agent](const std::string& notification) { agent->handleEvent(notification); });
     log.debug("entering the main loop");

@@ -4,8 +4,8 @@
 #include "platform/platform.h"
 #include "platform/text.h"
 #include "tool/exit_status.h"
-#include "tool/tool_identifier.h"
 #include "util/bind_utils.h"
+#include "util/tool_identifier.h"
 
 namespace vlm {
 

@@ -9,8 +9,8 @@
 
 #include "platform/platform.h"
 #include "platform/sandbox.h"
-#include "tool/tool_identifier.h"
 #include "util/bind_utils.h"
+#include "util/tool_identifier.h"
 
 namespace vlm {
 

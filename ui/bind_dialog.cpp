@@ -15,15 +15,13 @@ constexpr int kBadgePoints = 32;
 
 }  // namespace
 
-std::shared_ptr<BindDialog> BindDialog::initWithOperation(std::shared_ptr<BindOperation> operation,
-                                                          DialogActions actions) {
-    return std::shared_ptr<BindDialog>(new BindDialog(std::move(operation), std::move(actions)));
+std::shared_ptr<BindDialog> BindDialog::initWithOperation(
+    std::shared_ptr<BindOperation> operation) {
+    return std::shared_ptr<BindDialog>(new BindDialog(std::move(operation)));
 }
 
-BindDialog::BindDialog(std::shared_ptr<BindOperation> operation, DialogActions actions)
-    : WindowController("BindDialog"),
-      _operation(std::move(operation)),
-      _actions(std::move(actions)) {}
+BindDialog::BindDialog(std::shared_ptr<BindOperation> operation)
+    : WindowController("BindDialog"), _operation(std::move(operation)) {}
 
 void BindDialog::connectOutlets(platform::Window& window) {
     setIconView(window.iconView("iconView"));
@@ -99,15 +97,5 @@ void BindDialog::enabledObjects(Controls& enabled, platform::View& view) {
         enabledObjects(enabled, *part);
     }
 }
-
-void BindDialog::okClicked() {
-    const auto chosen = _identityPopup ? _identityPopup->selectedItem() : std::nullopt;
-    setEnabled(false);
-    _actions.okClicked(_operation, chosen ? chosen->object : std::nullopt);
-}
-
-void BindDialog::cancelClicked() { _actions.cancelClicked(_operation); }
-
-void BindDialog::dontShowAgainClicked() { _actions.dontShowAgainClicked(_operation); }
 
 }  // namespace vlm

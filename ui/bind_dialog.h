@@ -1,10 +1,12 @@
 // BindDialog: the window that offers to pair the user with an identity of an inserted card.
 //
 // Shapes:    one item of the pop-up for each public-key hash that can be paired, in one group for
-//            each token. Choosing an item only selects it.
+//            each token. Choosing an item only selects it. Each button ends the operation.
 // Ownership: holds its operation; the outlets belong to the window.
-// Threads:   the main queue's only; it may be made on any thread.
-// Blocking:  the first use loads the window.
+// Threads:   the main queue's only; it may be made on any thread. Pairing is done in the
+// background,
+//            which keeps the dialog until it is done.
+// Blocking:  the first use loads the window; Do not show again waits for the disk.
 // Errors:    a part that the window lacks is passed over.
 // In tests:  tests/unit/ui/bind_dialog_*_test.cpp
 
@@ -17,10 +19,11 @@
 
 #include "bind/bind_operation.h"
 #include "bind/pairing_dialog.h"
-#include "ui/dialog_actions.h"
 #include "ui/window_controller.h"
 
 namespace vlm {
+
+struct PairingOutcome;
 
 class BindDialog final : public PairingDialog,
                          public WindowController,
@@ -28,8 +31,7 @@ class BindDialog final : public PairingDialog,
 public:
     using Controls = std::vector<platform::Control*>;
 
-    static std::shared_ptr<BindDialog> initWithOperation(std::shared_ptr<BindOperation> operation,
-                                                         DialogActions actions);
+    static std::shared_ptr<BindDialog> initWithOperation(std::shared_ptr<BindOperation> operation);
 
     // PairingDialog:
     bool showWindow() override;
@@ -53,7 +55,7 @@ public:
     void setIdentityPopup(platform::PopUpButton* identityPopup) { _identityPopup = identityPopup; }
 
 private:
-    BindDialog(std::shared_ptr<BindOperation> operation, DialogActions actions);
+    explicit BindDialog(std::shared_ptr<BindOperation> operation);
 
     // WindowController:
     void connectOutlets(platform::Window& window) override;
@@ -63,13 +65,13 @@ private:
     void okClicked();
     void cancelClicked();
     void dontShowAgainClicked();
+    void finish(const BindOperation::OptionalHash& hash, const PairingOutcome& outcome);
 
     const std::shared_ptr<BindOperation> _operation;
     std::optional<Controls> _activeElements;
     platform::IconView* _iconView = nullptr;
     platform::TextLabel* _identityLabel = nullptr;
     platform::PopUpButton* _identityPopup = nullptr;
-    const DialogActions _actions;
 };
 
 }  // namespace vlm

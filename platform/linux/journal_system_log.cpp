@@ -13,6 +13,7 @@
 #include <cerrno>
 #include <cstdlib>
 #include <optional>
+#include <vector>
 
 #include "platform/linux/readable_text.h"
 #include "platform/platform.h"
@@ -63,17 +64,16 @@ std::string categoryAndText(const LogRecord& record) {
 }
 
 void writeToJournal(const LogRecord& record) {
-    std::array fields{
+    std::vector<std::string> fields{
         "MESSAGE=" + std::string(record.text),
         "PRIORITY=" + std::to_string(levelOf(record).priority),
         "SUBSYSTEM=" + std::string(record.subsystem),
         "CATEGORY=" + std::string(record.category),
         "SYSLOG_IDENTIFIER=" + std::string(program_invocation_short_name),
     };
-    std::array<iovec, fields.size()> parts{};
-    std::ranges::transform(fields, parts.begin(), [](std::string& field) {
-        return iovec{field.data(), field.size()};
-    });
+    if (!record.activity.empty()) fields.push_back("ACTIVITY=" + std::string(record.activity));
+    std::vector<iovec> parts;
+    for (auto& field : fields) parts.push_back({field.data(), field.size()});
     sd_journal_sendv(parts.data(), static_cast<int>(parts.size()));
 }
 

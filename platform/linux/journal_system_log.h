@@ -1,4 +1,4 @@
-// The journal as the system log, with fields to search by: SUBSYSTEM and CATEGORY.
+// The journal as the system log, with fields to search by: SUBSYSTEM, CATEGORY and ACTIVITY.
 //
 // Without a journal, lines go to syslog; or, where standard error is a terminal, only errors are
 // shown there, since a command prints for the person what it logs below that level.

@@ -1,11 +1,11 @@
 #include "platform/linux/sd_bus_named_service_ipc.h"
 
-#include <cerrno>
 #include <string>
 #include <system_error>
 #include <utility>
 
 #include "platform/linux/exchange_failure.h"
+#include "platform/linux/sd_bus_call.h"
 #include "platform/linux/sd_bus_handles.h"
 #include "platform/linux/sd_bus_message.h"
 #include "platform/platform.h"
@@ -13,33 +13,6 @@
 namespace vlm::platform {
 
 namespace {
-
-struct Answer {
-    SdBusMessage message;
-    bool came = false;
-};
-
-int keepAnswer(sd_bus_message* message, void* place, sd_bus_error*) {
-    auto& answer = *static_cast<Answer*>(place);
-    answer.message.reset(sd_bus_message_ref(message));
-    answer.came = true;
-    return 0;
-}
-
-// Sends the call and runs the connection until its answer is there; a connection that ends answers
-// the call with an error of its own. The loop is here, and not sd_bus_call(), because a signal must
-// neither end the wait nor make the request go out twice.
-int callAndWait(sd_bus* bus, sd_bus_message* call, Answer& answer) {
-    sd_bus_slot* slot = nullptr;
-    int result = sd_bus_call_async(bus, &slot, call, keepAnswer, &answer, UINT64_MAX);
-    const SdBusSlot outstanding(slot);
-    while (result >= 0 && !answer.came) {
-        result = sd_bus_process(bus, nullptr);
-        if (result == 0) result = sd_bus_wait(bus, UINT64_MAX);
-        if (result == -EINTR) result = 0;
-    }
-    return answer.came ? 0 : result;
-}
 
 std::string systemText(int result) { return std::generic_category().message(-result); }
 
@@ -73,12 +46,11 @@ Message SdBusConnection::sendAndWait(const Message& request) {
     std::string reason;
     const SdBusMessage call = makeCall(request, reason);
     if (!call) return failed(_failures.cannotBeSent(reason));
-    Answer answer;
-    const int result = callAndWait(_bus.get(), call.get(), answer);
+    SdBusMessage answer;
+    const int result = callAndWait(_bus.get(), call.get(), kAnyTime, answer);
     // The next exchange looks for the bus anew.
     if (sd_bus_is_open(_bus.get()) <= 0) _bus.reset();
-    return result < 0 ? failed(_failures.busWentAway(systemText(result)))
-                      : replyFrom(answer.message.get());
+    return result < 0 ? failed(_failures.busWentAway(systemText(result))) : replyFrom(answer.get());
 }
 
 int SdBusConnection::openBus() {

@@ -15,6 +15,7 @@ struct LogLine {
     std::string category;
     platform::LogLevel level = platform::LogLevel::Default;
     std::string text;
+    std::string activity = {};
     bool operator==(const LogLine&) const = default;
 };
 
@@ -30,6 +31,17 @@ TYPED_TEST_P(SystemLogContract, DeliversARecordWithAllThatItHolds) {
     EXPECT_EQ(this->backend().delivered(),
               (std::vector<LogLine>{
                   {"org.example", "pairing", platform::LogLevel::Error, "it did not work"}}));
+}
+
+TYPED_TEST_P(SystemLogContract, DeliversTheActivityOfARecordThatHasOne) {
+    this->backend().get().write({"s", "c", platform::LogLevel::Error, "x", "clicked 'Pair'"});
+    this->backend().get().write({"s", "c", platform::LogLevel::Error, "x"});
+
+    const auto lines = this->backend().delivered();
+
+    ASSERT_EQ(lines.size(), 2U);
+    EXPECT_EQ(lines[0].activity, "clicked 'Pair'");
+    EXPECT_EQ(lines[1].activity, "");
 }
 
 TYPED_TEST_P(SystemLogContract, KeepsLevelsAndOrder) {
@@ -76,7 +88,8 @@ TYPED_TEST_P(SystemLogContract, DeliversEveryLevelThatItSaysItCollects) {
 }
 
 REGISTER_TYPED_TEST_SUITE_P(SystemLogContract, DeliversARecordWithAllThatItHolds,
-                            KeepsLevelsAndOrder, KeepsARecordWithLineFeedsInOnePiece,
-                            TakesUtf8AndEmptyText, DeliversEveryLevelThatItSaysItCollects);
+                            DeliversTheActivityOfARecordThatHasOne, KeepsLevelsAndOrder,
+                            KeepsARecordWithLineFeedsInOnePiece, TakesUtf8AndEmptyText,
+                            DeliversEveryLevelThatItSaysItCollects);
 
 }  // namespace vlm::contracts

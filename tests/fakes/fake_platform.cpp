@@ -23,6 +23,7 @@ namespace vlm::platform {
 
 Accounts& Platform::accounts() { return *fakes::installed->accounts; }
 Application& Platform::application() { return *fakes::installed->application; }
+Authorization& Platform::authorization() { return *fakes::installed->authorization; }
 ConsoleSessions& Platform::consoleSessions() { return *fakes::installed->consoleSessions; }
 Keychain& Platform::keychain() { return *fakes::installed->keychain; }
 Localization& Platform::localization() { return *fakes::installed->localization; }

@@ -5,6 +5,7 @@
 
 #include "fake_accounts.h"
 #include "fake_application.h"
+#include "fake_authorization.h"
 #include "fake_console_sessions.h"
 #include "fake_keychain.h"
 #include "fake_localization.h"
@@ -30,6 +31,7 @@ public:
     // The fakes, for a test to set up and to look at.
     FakeAccounts fakeAccounts;
     FakeApplication fakeApplication;
+    FakeAuthorization fakeAuthorization;
     FakeConsoleSessions fakeConsoleSessions;
     FakeKeychain fakeKeychain;
     FakeLocalization fakeLocalization;
@@ -46,6 +48,7 @@ public:
     // What the code under test gets.
     platform::Accounts* accounts = &fakeAccounts;
     platform::Application* application = &fakeApplication;
+    platform::Authorization* authorization = &fakeAuthorization;
     platform::ConsoleSessions* consoleSessions = &fakeConsoleSessions;
     platform::Keychain* keychain = &fakeKeychain;
     platform::Localization* localization = &fakeLocalization;

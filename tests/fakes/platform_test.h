@@ -20,6 +20,7 @@ protected:
     FakePlatform& fakePlatform() { return _platform; }
     FakeAccounts& accounts() { return _platform.fakeAccounts; }
     FakeApplication& application() { return _platform.fakeApplication; }
+    FakeAuthorization& authorization() { return _platform.fakeAuthorization; }
     FakeConsoleSessions& sessions() { return _platform.fakeConsoleSessions; }
     FakeKeychain& keychain() { return _platform.fakeKeychain; }
     FakeLocalization& localization() { return _platform.fakeLocalization; }

@@ -16,6 +16,7 @@ public:
         std::string category;
         platform::LogLevel level;
         std::string text;
+        std::string activity = {};
         bool operator==(const Line&) const = default;
     };
 
@@ -24,7 +25,7 @@ public:
     void write(const platform::LogRecord& record) override {
         const std::lock_guard lock(_mutex);
         _lines.push_back({std::string(record.subsystem), std::string(record.category), record.level,
-                          std::string(record.text)});
+                          std::string(record.text), std::string(record.activity)});
     }
 
     std::vector<Line> lines() const {

@@ -1,11 +1,5 @@
 #include "tests/integration/linux/bus_service.h"
 
-#include <poll.h>
-#include <sys/eventfd.h>
-#include <unistd.h>
-
-#include <array>
-#include <cstdint>
 #include <system_error>
 #include <utility>
 
@@ -58,39 +52,19 @@ BusService::BusService(const std::string& address, const std::string& name, Hand
                SD_BUS_METHOD(platform::kExchangeMethod, "a{sv}", _resultSignature.c_str(),
                              &BusService::dispatch, SD_BUS_VTABLE_UNPRIVILEGED),
                SD_BUS_VTABLE_END},
-      _bus(connectTo(address)),
-      _stop(::eventfd(0, EFD_CLOEXEC)) {
+      _bus(connectTo(address)) {
     sd_bus_slot* object = nullptr;
     check(sd_bus_add_object_vtable(_bus.get(), &object, platform::kExchangeObject,
                                    platform::kExchangeInterface, _methods, this),
           "object");
     _object.reset(object);
     check(sd_bus_request_name(_bus.get(), name.c_str(), 0), name.c_str());
-    _thread = std::thread([this] { run(); });
-}
-
-BusService::~BusService() {
-    const std::uint64_t one = 1;
-    [[maybe_unused]] const auto written = ::write(_stop, &one, sizeof one);
-    _thread.join();
-    ::close(_stop);
+    _thread.emplace(_bus.get());
 }
 
 int BusService::dispatch(sd_bus_message* call, void* service, sd_bus_error*) {
     const int result = static_cast<BusService*>(service)->_handler(call);
     return result < 0 ? result : 1;
-}
-
-void BusService::run() {
-    for (;;) {
-        const int result = sd_bus_process(_bus.get(), nullptr);
-        if (result < 0) return;
-        if (result > 0) continue;
-        std::array<pollfd, 2> waiting{
-            {{_stop, POLLIN, 0},
-             {sd_bus_get_fd(_bus.get()), static_cast<short>(sd_bus_get_events(_bus.get())), 0}}};
-        if (::poll(waiting.data(), waiting.size(), -1) > 0 && waiting[0].revents != 0) return;
-    }
 }
 
 }  // namespace vlm::test

@@ -6,11 +6,12 @@
 #pragma once
 
 #include <functional>
+#include <optional>
 #include <string>
-#include <thread>
 
 #include "platform/linux/sd_bus_handles.h"
 #include "platform/message.h"
+#include "tests/integration/linux/bus_thread.h"
 
 namespace vlm::test {
 
@@ -24,22 +25,19 @@ public:
     BusService(const std::string& address, const std::string& name, Handler handler,
                std::string resultSignature = "a{sv}");
 
-    // The service leaves the bus, with calls unanswered if there are any.
-    ~BusService();
+    // The service leaves the bus with the object, with calls unanswered if there are any.
     BusService(const BusService&) = delete;
     BusService& operator=(const BusService&) = delete;
 
 private:
     static int dispatch(sd_bus_message* call, void* service, sd_bus_error* error);
-    void run();
 
     const Handler _handler;
     const std::string _resultSignature;
     sd_bus_vtable _methods[3];
-    platform::SdBus _bus;  // the thread's while it runs
+    platform::SdBus _bus;
     platform::SdBusSlot _object;
-    int _stop = -1;
-    std::thread _thread;
+    std::optional<BusThread> _thread;
 };
 
 // A connection to the bus at an address.

@@ -143,10 +143,24 @@ TEST(InstalledTextsTest, NameTheReasonOfAFailedPairingInEveryLanguage) {
         EXPECT_NE(textOf("PAIRING_FAILED"), "") << language;
         EXPECT_EQ(textOf("PAIRING_FAILED").find("{}"), std::string::npos) << language;
 
-        const std::string pattern = textOf("PAIRING_ERROR");
-        EXPECT_NE(pattern.find("{}"), std::string::npos) << language;
-        EXPECT_EQ(pattern.find("{}"), pattern.rfind("{}")) << language;
-        EXPECT_TRUE(seen.insert(pattern + textOf("PAIRING_FAILED")).second) << language;
+        for (const std::string key : {"PAIRING_ERROR", "AUTH_ERROR"}) {
+            const std::string pattern = textOf(key);
+            EXPECT_NE(pattern.find("{}"), std::string::npos) << language << " " << key;
+            EXPECT_EQ(pattern.find("{}"), pattern.rfind("{}")) << language << " " << key;
+        }
+        EXPECT_TRUE(seen.insert(textOf("PAIRING_ERROR") + textOf("PAIRING_FAILED")).second)
+            << language;
+    }
+}
+
+TEST(InstalledTextsTest, TellOfAPairingWithoutAnUnlockKeyInEveryLanguage) {
+    for (const std::string key : {"STORE_UNLOCK_KEY_FAILED", "STORE_UNLOCK_KEY_FAILED_INFO"}) {
+        const auto english = textInEnvironment({{"LANG", "en_GB.UTF-8"}}, key);
+        const auto german = textInEnvironment({{"LANG", "de_DE.UTF-8"}}, key);
+        EXPECT_NE(english, "") << key;
+        EXPECT_NE(german, english) << key;
+        for (const auto& text : {english, german})
+            EXPECT_EQ(text.find("{}"), std::string::npos) << text;
     }
 }
 

@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "platform/accounts.h"
+#include "platform/authorization.h"
 #include "platform/console_sessions.h"
 #include "platform/localization.h"
 #include "platform/platform.h"
@@ -68,7 +69,17 @@ int collects(const Arguments& arguments) {
 
 int log(const Arguments& arguments) {
     current().systemLog().write({arguments.at(0), arguments.at(1),
-                                 static_cast<LogLevel>(number(arguments.at(2))), arguments.at(3)});
+                                 static_cast<LogLevel>(number(arguments.at(2))), arguments.at(3),
+                                 arguments.at(4)});
+    return 0;
+}
+
+int authorize(const Arguments& arguments) {
+    auto created = current().authorization().createSession();
+    if (created.session)
+        created.status = created.session->request(
+            arguments.at(0), {.interactionAllowed = true, .extendRights = true});
+    std::cout << created.status;
     return 0;
 }
 
@@ -81,8 +92,9 @@ int text(const Arguments& arguments) {
 
 int main(int argc, char* argv[]) {
     const std::map<std::string, int (*)(const Arguments&)> questions{
-        {"sessions", sessions}, {"user-id", userId}, {"user-name", userName}, {"process", process},
-        {"collects", collects}, {"log", log},        {"text", text}};
+        {"sessions", sessions}, {"user-id", userId},     {"user-name", userName},
+        {"process", process},   {"collects", collects},  {"log", log},
+        {"text", text},         {"authorize", authorize}};
     const Arguments arguments(argv + 1, argv + argc);
     const auto question = questions.find(arguments.at(0));
     if (question == questions.end()) return 1;

@@ -27,7 +27,8 @@ Child::Options with(Environment environment) {
 }
 
 std::vector<std::string> logging(LogLevel level, const std::string& text) {
-    return probe({"log", "org.example", "pairing", std::to_string(static_cast<int>(level)), text});
+    return probe(
+        {"log", "org.example", "pairing", std::to_string(static_cast<int>(level)), text, ""});
 }
 
 // The text of all four levels on standard error.
@@ -43,7 +44,7 @@ public:
     std::vector<contracts::LogLine> delivered() {
         std::vector<contracts::LogLine> lines;
         for (const auto& line : get().lines())
-            lines.push_back({line.subsystem, line.category, line.level, line.text});
+            lines.push_back({line.subsystem, line.category, line.level, line.text, line.activity});
         return lines;
     }
 };
@@ -62,10 +63,11 @@ public:
     }
 
     void write(const platform::LogRecord& record) override {
-        const auto ended = _machine.run(
-            probe({"log", std::string(record.subsystem), std::string(record.category),
-                   std::to_string(static_cast<int>(record.level)), std::string(record.text)}),
-            with({}));
+        const auto ended =
+            _machine.run(probe({"log", std::string(record.subsystem), std::string(record.category),
+                                std::to_string(static_cast<int>(record.level)),
+                                std::string(record.text), std::string(record.activity)}),
+                         with({}));
         EXPECT_EQ(ended.status, 0) << ended.errors;
         EXPECT_EQ(ended.errors, "");
     }
@@ -76,8 +78,8 @@ public:
             constexpr std::array kPriorities{"3", "5", "6", "7"};
             const auto* level = std::ranges::find(kPriorities, fields["PRIORITY"]);
             lines.push_back({fields["SUBSYSTEM"], fields["CATEGORY"],
-                             static_cast<LogLevel>(level - kPriorities.begin()),
-                             fields["MESSAGE"]});
+                             static_cast<LogLevel>(level - kPriorities.begin()), fields["MESSAGE"],
+                             fields["ACTIVITY"]});
         }
         return lines;
     }

@@ -8,7 +8,11 @@
 #include <QLabel>
 #include <QPushButton>
 #include <QTest>
+#include <cstdlib>
+#include <functional>
 
+#include "platform/linux/event_loop_work_queues.h"
+#include "tests/integration/linux/child.h"
 #include "tests/integration/windowing/screen.h"
 
 namespace vlm::test {
@@ -17,28 +21,39 @@ namespace {
 class BindDialogOnScreen : public ::testing::Test {
 protected:
     void SetUp() override {
+        // Nobody can be asked for a right, so that every pairing fails in its own way.
+        ::setenv("DBUS_SYSTEM_BUS_ADDRESS", "unix:path=/nowhere", 1);
         windowingOnScreen();
         operation->setUnpairedIdentities(BindOperation::UnpairedIdentities{
             {"blue", {{{1}, "Bob"}, {{2}, "Alice"}}}, {"red", {{{3}, "Carol"}}}});
+        operation->setReply([this](BindResult result, const std::optional<platform::Error>& why) {
+            replies.push_back(result);
+            error = why;
+        });
+        operation->setDialog(dialog);
         dialog->showWindow();
         ASSERT_TRUE(bindDialog());
     }
     void TearDown() override {
+        operation->setDialog(nullptr);
         dialog.reset();
         settle();
+        ::unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
     }
 
-    std::vector<std::string> calls;
-    BindOperation::OptionalHash paired;
+    // Whether it becomes so while the main queue is worked off.
+    bool becomes(const std::function<bool()>& isSo) {
+        return eventually([&] {
+            platform::mainLoop().dispatch();
+            settle();
+            return isSo();
+        });
+    }
+
+    std::vector<BindResult> replies;
+    std::optional<platform::Error> error;
     std::shared_ptr<BindOperation> operation = BindOperation::initWithUserName("alice");
-    std::shared_ptr<BindDialog> dialog = BindDialog::initWithOperation(
-        operation, {[this](const auto&, const auto& hash) { paired = hash; },
-                    [this](const auto&) {
-                        dialog->close();
-                        dialog.reset();
-                        calls.push_back("cancel");
-                    },
-                    [this](const auto&) { calls.push_back("dontShowAgain"); }});
+    std::shared_ptr<BindDialog> dialog = BindDialog::initWithOperation(operation);
 };
 
 TEST_F(BindDialogOnScreen, ListsTheIdentitiesInGroups) {
@@ -52,14 +67,12 @@ TEST_F(BindDialogOnScreen, ListsTheIdentitiesInGroups) {
     EXPECT_EQ(box.currentIndex(), 0);
 }
 
-TEST_F(BindDialogOnScreen, PairsTheIdentityThatWasChosenWithTheKeyboard) {
+TEST_F(BindDialogOnScreen, SelectsTheIdentityThatWasChosenWithTheKeyboard) {
     auto& box = part<QComboBox>("identityPopup");
     QTest::keyClick(&box, Qt::Key_Down);
     QTest::keyClick(&box, Qt::Key_Down);  // over the separator
 
-    click("okButton");
-
-    EXPECT_EQ(paired, platform::Bytes{3});
+    EXPECT_EQ(dialog->identityPopup()->selectedItem()->object, platform::Bytes{3});
 }
 
 TEST_F(BindDialogOnScreen, PairingDisablesEveryControl) {
@@ -69,14 +82,32 @@ TEST_F(BindDialogOnScreen, PairingDisablesEveryControl) {
     for (const char* button : {"okButton", "cancelButton", "dontShowAgainButton"})
         EXPECT_FALSE(part<QPushButton>(button).isEnabled()) << button;
     EXPECT_TRUE(part<QLabel>("messageLabel").isEnabled());
+    EXPECT_TRUE(becomes([] { return sheet(); }));
+}
+
+TEST_F(BindDialogOnScreen, APairingWithoutTheRightFailsAfterAnAlert) {
+    click("okButton");
+    ASSERT_TRUE(becomes([] { return sheet(); }));
+    EXPECT_TRUE(sheet()->informativeText().contains("-60008"))
+        << sheet()->informativeText().toStdString();
+    EXPECT_TRUE(replies.empty());
+
+    QTest::keyClick(sheet(), Qt::Key_Return);
+
+    ASSERT_TRUE(becomes([this] { return !replies.empty(); }));
+    EXPECT_EQ(replies, std::vector{BindResult::Failed});
+    EXPECT_EQ(error->code, -5);
+    EXPECT_TRUE(becomes([] { return !bindDialog() || !bindDialog()->isVisible(); }));
 }
 
 TEST_F(BindDialogOnScreen, ClosingTheWindowCancelsAndMayLetTheDialogGo) {
-    bindDialog()->close();
-    settle();
+    dialog.reset();
 
-    EXPECT_EQ(calls, std::vector<std::string>{"cancel"});
-    EXPECT_EQ(bindDialog(), nullptr);
+    bindDialog()->close();
+
+    EXPECT_TRUE(becomes([this] { return !replies.empty(); }));
+    EXPECT_EQ(replies, std::vector{BindResult::Canceled});
+    EXPECT_TRUE(becomes([] { return !bindDialog(); }));
 }
 
 }  // namespace

@@ -8,11 +8,8 @@
 
 int main() {
     using namespace vlm;
-    const auto nothing = [](const auto&...) {};
-    const auto operation = BindOperation::initWithUserName(
-        BindUtils::processOwnerUserName(), [&](const auto& offered) {
-            return BindDialog::initWithOperation(offered, {nothing, nothing, nothing});
-        });
+    const auto operation = BindOperation::initWithUserName(BindUtils::processOwnerUserName(),
+                                                           BindDialog::initWithOperation);
     operation->startWithReply([](BindResult result, const auto&) {
         std::cout << "result " << static_cast<int>(result) << '\n';
         platform::mainLoop().end(0);

@@ -63,10 +63,9 @@ QPixmap pictureOf(QWidget& window) {
 
 int draw(const std::string& file, const Words& words) {
     const auto wants = [&](const char* word) { return std::ranges::count(words, word) > 0; };
-    const auto nothing = [](const auto&...) {};
     const auto operation = BindOperation::initWithUserName("alice");
     operation->setUnpairedIdentities(identities(wants("long")));
-    const auto dialog = BindDialog::initWithOperation(operation, {nothing, nothing, nothing});
+    const auto dialog = BindDialog::initWithOperation(operation);
     dialog->showWindow();
     if (!dialog->window()) return 1;
 

@@ -1,5 +1,7 @@
 #include "platform/system_log.h"
 
+#include <thread>
+
 #include "platform_test.h"
 
 namespace vlm::platform {
@@ -36,6 +38,46 @@ TEST_F(LogTest, FillsValuesIntoItsPattern) {
     kLog.notice("{} cards for {}", 2, "alice");
 
     EXPECT_TRUE(log().has(LogLevel::Default, "2 cards for alice"));
+}
+
+// What the lines so far belong to.
+class LogActivityTest : public LogTest {
+protected:
+    std::vector<std::string> activities() {
+        std::vector<std::string> names;
+        for (const auto& line : log().lines()) names.push_back(line.activity);
+        return names;
+    }
+};
+
+TEST_F(LogActivityTest, NamesTheLinesOfItsLife) {
+    kLog.notice("before");
+    {
+        const LogActivity activity("clicked");
+        kLog.notice("during");
+    }
+    kLog.notice("after");
+
+    EXPECT_EQ(activities(), (std::vector<std::string>{"", "clicked", ""}));
+}
+
+TEST_F(LogActivityTest, GivesWayToAnInnerOne) {
+    const LogActivity outer("new token");
+    {
+        const LogActivity inner("clicked");
+        kLog.notice("inner");
+    }
+    kLog.notice("outer");
+
+    EXPECT_EQ(activities(), (std::vector<std::string>{"clicked", "new token"}));
+}
+
+TEST_F(LogActivityTest, IsItsThreadsAlone) {
+    const LogActivity activity("clicked");
+
+    std::thread([] { kLog.notice("elsewhere"); }).join();
+
+    EXPECT_EQ(activities(), std::vector<std::string>{""});
 }
 
 class LogWithoutDebugReaders : public fakes::PlatformTest {

@@ -85,6 +85,14 @@ TEST_F(AgentTest, ANewTokenStartsABind) {
     end(BindResult::Canceled);
 }
 
+TEST_F(AgentTest, WhatANotificationLeadsToIsSaidInItsActivity) {
+    application().deliver(kNewToken);
+
+    for (const auto& line : log().lines()) EXPECT_EQ(line.activity, "new token notification");
+    EXPECT_FALSE(log().lines().empty());
+    workQueues().runBackground();
+}
+
 TEST_F(AgentTest, OfTwoNotificationsInQuickSuccessionOneStartsABind) {
     startWithACard();
     application().deliver(kNewToken);

@@ -3,10 +3,13 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "fake_bind_dialog_window.h"
+#include "fake_hints_service.h"
+#include "fake_unlock_key.h"
 #include "platform_test.h"
 #include "ui/bind_dialog.h"
 
@@ -15,18 +18,33 @@ namespace vlm {
 class BindDialogTest : public fakes::PlatformTest {
 protected:
     using Bytes = platform::Bytes;
+    using Error = platform::Error;
     using Strings = std::vector<std::string>;
 
     const std::string blue = "pkcs11:token=blue";
     const std::string red = "pkcs11:token=red";
 
-    void SetUp() override { fakes::describeBindDialog(windowing()); }
+    void SetUp() override {
+        fakes::describeBindDialog(windowing());
+        fakes::unlockKey() = {};
+        service.plugInto(ipc());
+        operation->setReply([this](BindResult result, const std::optional<Error>& error) {
+            replies.push_back(result);
+            repliedError = error;
+        });
+    }
 
     void offer(BindOperation::UnpairedIdentities identities) {
         operation->setUnpairedIdentities(std::move(identities));
     }
 
-    fakes::FakeScreenWindow& screen() { return *windowing().windows.at(0); }
+    // A card with the identities {1} and {2}, in the reader and in the dialog.
+    void offerBlueCard() {
+        service.insert({blue, "Blue Card", {{{1}, "A"}, {{2}, "B"}}, Bytes{0xBB}});
+        offer({{blue, {{{1}, "A"}, {{2}, "B"}}}});
+    }
+
+    fakes::FakeScreenWindow& screen() { return *windowing().windows.back(); }
     fakes::FakePopUpButton& popUp() {
         return *screen().content.find<fakes::FakePopUpButton>("identityPopup");
     }
@@ -40,31 +58,30 @@ protected:
         return titles;
     }
 
-    DialogActions actions() {
-        return {
-            [this](const auto& of, const auto& hash) {
-                calls.push_back("ok");
-                paired = hash;
-                actedOn = of;
-            },
-            [this](const auto& of) {
-                calls.push_back("cancel");
-                actedOn = of;
-            },
-            [this](const auto& of) {
-                calls.push_back("dontShowAgain");
-                actedOn = of;
-            },
-        };
+    // How the operation was finished so far, each time as its line in the log says it.
+    Strings finishes() {
+        const std::string beginning = "finishWithResult: ";
+        Strings lines;
+        for (const auto& line : log().texts(platform::LogLevel::Debug))
+            if (line.starts_with(beginning)) lines.push_back(line.substr(beginning.size()));
+        return lines;
     }
 
-    std::shared_ptr<BindOperation> operation = BindOperation::initWithUserName("alice");
-    std::shared_ptr<BindDialog> dialog = BindDialog::initWithOperation(operation, actions());
+    // What the lines so far belong to, each activity once, in order.
+    Strings activities() {
+        Strings names;
+        for (const auto& line : log().lines())
+            if (names.empty() || names.back() != line.activity) names.push_back(line.activity);
+        return names;
+    }
 
-    // What the actions were called with.
-    Strings calls;
-    BindOperation::OptionalHash paired;
-    std::shared_ptr<BindOperation> actedOn;
+    fakes::FakeHintsService service;
+    std::shared_ptr<BindOperation> operation = BindOperation::initWithUserName("alice");
+    std::shared_ptr<BindDialog> dialog = BindDialog::initWithOperation(operation);
+
+    // What the operation reported.
+    std::vector<BindResult> replies;
+    std::optional<Error> repliedError;
 };
 
 }  // namespace vlm

@@ -114,7 +114,7 @@ TEST_F(BindDialogWindow, IsClosed) {
     dialog->close();
 
     EXPECT_TRUE(screen().closed);
-    EXPECT_EQ(calls, Strings{}) << "closing is no click";
+    EXPECT_EQ(finishes(), Strings{}) << "closing is no click";
 }
 
 TEST_F(BindDialogWindow, GoesWithTheDialog) {
