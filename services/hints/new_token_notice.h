@@ -42,7 +42,7 @@ public:
     // The tokens that the daemon knows, and whether those are certainly all.
     void looked(const Tokens& tokens, bool isCertain);
 
-    // Users may have come to the console or left it.
+    // The user has come to the console or left it.
     void consoleChanged() { tell(); }
 
     // One left its reader, and the next looks tell which.

@@ -8,9 +8,9 @@ def runs(lab) -> bool:
 
 
 def leave_soon(lab) -> None:
-    """Makes the next one leave after one quiet second."""
+    """Makes the next one leave after a few quiet seconds, more than between two looks at a card."""
     lines = (
-        r"[Service]\nExecStart=\nExecStart=/usr/libexec/vlm/vlmhintsd --system --idle-seconds 1\n"
+        r"[Service]\nExecStart=\nExecStart=/usr/libexec/vlm/vlmhintsd --system --idle-seconds 3\n"
     )
     folder = f"/run/systemd/system/{SERVICE}.d"
     lab.root("sh", "-c", f"mkdir -p {folder} && printf '{lines}' >{folder}/soon.conf")

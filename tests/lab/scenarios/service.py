@@ -8,6 +8,9 @@ from machine.listing import identities, only_identity, pair, present
 
 
 def nothing_starts_it_but_a_request(lab):
+    # The user's instance asks for the cards that are in.
+    lab.user("alice", "systemctl", "--user", "stop", SERVICE)
+    lab.root("systemctl", "stop", SERVICE)
     check.assertFalse(runs(lab), lab.journal("-u", SERVICE))
 
     check.assertEqual(lab.root("vlmbind", "-i").status, 0)
