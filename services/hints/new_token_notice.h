@@ -1,8 +1,8 @@
 // NewTokenNotice: decides when the desktop's agent is told that a token was inserted.
 //
-// It is told once for each token that comes, and for those that are in at the start. A token that is
-// not seen counts as gone only when a card was pulled, or when that is certain: a daemon that was
-// just started may not have read it yet, and a pcscd that restarts takes its readers along and
+// It is told once for each token that comes, and for those that are in at the start. A token that
+// is not seen counts as gone only when a card was pulled, or when that is certain: a daemon that
+// was just started may not have read it yet, and a pcscd that restarts takes its readers along and
 // brings them back. What comes while the user is not at the console is told when the user is back,
 // if it is still in then: the agent would open its window on a screen that nobody sees.
 //
