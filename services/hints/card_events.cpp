@@ -132,7 +132,8 @@ void CardEvents::Waiter::waitForCards(const PcscConnection& connection) {
         const bool areNew = states.setReaders(*readers);
         const auto most = areNew ? std::optional(kBurst) : std::nullopt;
         if (!connection.waitForChange(states, most)) return;
-        if (states.takeCardEvent()) report(CardEvent::CardMoved);
+        const bool isPulled = states.takeCardPulled();
+        if (states.takeCardEvent()) report(isPulled ? CardEvent::CardPulled : CardEvent::CardMoved);
     }
 }
 
@@ -145,10 +146,10 @@ bool CardEvents::Waiter::pause(const PcscdSocket& socket, std::optional<millisec
     return ended > 0;
 }
 
-// What became of pcscd must not be lost among its cards, and the latest of it counts.
+// Of what is not yet taken, the latest about pcscd counts, else a card that was pulled.
 void CardEvents::Waiter::report(CardEvent event) {
     const std::lock_guard lock(_mutex);
-    if (event != CardEvent::CardMoved) _event = event;
+    if (event >= CardEvent::PcscdCame || event > _event) _event = event;
     eventfd_write(_report.get(), 1);
 }
 

@@ -22,8 +22,13 @@
 
 namespace vlm::service {
 
-// What has happened; a coming or going of pcscd may have cards of its readers come or go with it.
-enum class CardEvent { CardMoved, PcscdCame, PcscdWent };
+// What has happened. Cards that come and go with pcscd may have been in their readers all the time.
+enum class CardEvent {
+    CardMoved,   // or its reader
+    CardPulled,  // certainly
+    PcscdCame,
+    PcscdWent,
+};
 
 class CardEvents {
 public:

@@ -1,4 +1,4 @@
-// ConsoleWatch: whether this instance's user is at the console, and when that may have changed.
+// ConsoleWatch: whether this instance's user is at the console, and when that changes.
 //
 // Ownership: the loop outlives it. Threads: the event loop's.
 // Blocking:  no; reads what logind has published, which also tells of each change.
@@ -24,13 +24,20 @@ class ConsoleWatch {
 public:
     ConsoleWatch(sd_event* event, std::function<void()> changed);
 
+    ConsoleWatch(const ConsoleWatch&) = delete;
+    ConsoleWatch& operator=(const ConsoleWatch&) = delete;
+
 private:
     struct MonitorUnref {
         void operator()(sd_login_monitor* monitor) const { sd_login_monitor_unref(monitor); }
     };
 
+    void sessionsChanged();
+
+    const std::function<void()> _changed;
     std::unique_ptr<sd_login_monitor, MonitorUnref> _monitor;
-    EventSource _changed;
+    bool _wasAtConsole = false;
+    EventSource _sessionsChanged;
 };
 
 }  // namespace vlm::service

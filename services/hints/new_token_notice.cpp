@@ -11,6 +11,7 @@ void NewTokenNotice::looked(const Tokens& tokens, bool isCertain) {
     _isCertain = isCertain;
     forgetThoseGone();
     tell();
+    if (isCertain) _isCardPulled = false;
 }
 
 void NewTokenNotice::pcscdWent() {
@@ -27,7 +28,7 @@ void NewTokenNotice::pcscdCame() {
 }
 
 void NewTokenNotice::forgetThoseGone() {
-    if (!_isCertain || _areReadersAway) return;
+    if (!_isCardPulled && (!_isCertain || _areReadersAway)) return;
     std::erase_if(_told, [this](const std::string& token) { return !_in.contains(token); });
 }
 

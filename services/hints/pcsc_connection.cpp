@@ -10,6 +10,10 @@ namespace {
 // Stands for the list of readers itself.
 constexpr const char* kReaderList = "\\\\?PnP?\\Notification";
 
+// A wait that is INFINITE wakes once a minute inside of PC/SC. It reckons in microseconds, for
+// which a 32-bit number has to be enough.
+constexpr std::chrono::milliseconds kWithoutAnEnd = std::chrono::minutes(30);
+
 SCARD_READERSTATE stateOf(const char* reader, ReaderStates::State seen) {
     SCARD_READERSTATE state = {};
     state.szReader = reader;
@@ -49,7 +53,7 @@ bool PcscConnection::waitForChange(ReaderStates& states,
     for (const auto& [reader, seen] : states.seen())
         watched.push_back(stateOf(reader.c_str(), seen));
     watched.push_back(stateOf(kReaderList, SCARD_STATE_UNAWARE));
-    const auto time = most ? static_cast<DWORD>(most->count()) : DWORD{INFINITE};
+    const auto time = static_cast<DWORD>(most.value_or(kWithoutAnEnd).count());
     const LONG result = SCardGetStatusChange(_context, time, watched.data(), watched.size());
     if (result == SCARD_E_TIMEOUT || result == SCARD_E_UNKNOWN_READER) return true;
     if (result != SCARD_S_SUCCESS) return false;

@@ -33,7 +33,8 @@ public:
     std::optional<std::vector<std::string>> readers() const;
 
     // Waits until a reader's state is another than the one seen, or readers come or go, or the time
-    // is over. False when the service is gone or cancel() was called.
+    // is over; without one, it may also end now and then. False when the service is gone or
+    // cancel() was called.
     bool waitForChange(ReaderStates& states, std::optional<std::chrono::milliseconds> most) const;
 
     // Ends a wait that is under way now; one that begins later does not hear of it.

@@ -35,10 +35,14 @@ bool ReaderStates::setReaders(const std::vector<std::string>& readers) {
 void ReaderStates::see(const std::string& reader, State state) {
     auto& before = _seen[reader];
     const bool isNew = before == SCARD_STATE_UNAWARE;
-    _isCardEvent |= isNew ? hasCard(state) : ((before ^ state) & kCardBits) != 0;
+    const bool isChanged = isNew ? hasCard(state) : ((before ^ state) & kCardBits) != 0;
+    _isCardEvent |= isChanged;
+    _isCardPulled |= isChanged && hasCard(before) && (state & SCARD_STATE_UNAVAILABLE) == 0;
     before = state & ~State{SCARD_STATE_CHANGED};
 }
 
 bool ReaderStates::takeCardEvent() { return std::exchange(_isCardEvent, false); }
+
+bool ReaderStates::takeCardPulled() { return std::exchange(_isCardPulled, false); }
 
 }  // namespace vlm::service

@@ -30,9 +30,14 @@ public:
     // Whether a card has come or gone since this was asked last.
     bool takeCardEvent();
 
+    // Whether a card has left a reader that stays, since this was asked last. A reader that goes
+    // with its card may have been unplugged, or pcscd may be ending.
+    bool takeCardPulled();
+
 private:
     std::map<std::string, State> _seen;
     bool _isCardEvent = false;
+    bool _isCardPulled = false;
 };
 
 }  // namespace vlm::service

@@ -51,6 +51,7 @@ SessionTokens::SessionTokens(const Parts& parts)
       }) {}
 
 void SessionTokens::cardEvent(CardEvent event) {
+    if (event == CardEvent::CardPulled) _notice.cardPulled();
     if (event == CardEvent::PcscdWent) _notice.pcscdWent();
     if (event == CardEvent::PcscdCame) _notice.pcscdCame();
     _lookout.cardEvent();

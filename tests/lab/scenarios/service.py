@@ -3,25 +3,27 @@
 import subprocess
 
 from machine.checks import check
+from machine.hints_daemon import SERVICE, leave_soon, runs
 from machine.listing import identities, only_identity, pair, present
-
-SERVICE = "vlmhintsd.service"
 
 
 def nothing_starts_it_but_a_request(lab):
-    check.assertFalse(_runs(lab), lab.journal("-u", SERVICE))
+    # The user's instance asks for the cards that are in.
+    lab.user("alice", "systemctl", "--user", "stop", SERVICE)
+    lab.root("systemctl", "stop", SERVICE)
+    check.assertFalse(runs(lab), lab.journal("-u", SERVICE))
 
     check.assertEqual(lab.root("vlmbind", "-i").status, 0)
 
-    check.assertTrue(_runs(lab))
+    check.assertTrue(runs(lab))
 
 
 def it_leaves_when_idle_and_comes_back_with_its_pairings(lab):
-    _leave_soon(lab)
+    leave_soon(lab)
     hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
-    lab.wait_until("it left", lambda: not _runs(lab))
+    lab.wait_until("it left", lambda: not runs(lab))
     left = lab.root("systemctl", "show", SERVICE, "--property=Result", "--value")
     check.assertEqual(left.output, "success\n")
 
@@ -84,18 +86,5 @@ def its_database_is_roots_alone(lab):
     check.assertNotEqual(lab.user("alice", "cat", database).status, 0)
 
 
-def _runs(lab) -> bool:
-    return lab.root("systemctl", "is-active", "--quiet", SERVICE).status == 0
-
-
 def _main_pid(lab) -> str:
     return lab.root("systemctl", "show", SERVICE, "--property=MainPID", "--value").output
-
-
-def _leave_soon(lab) -> None:
-    lines = (
-        r"[Service]\nExecStart=\nExecStart=/usr/libexec/vlm/vlmhintsd --system --idle-seconds 1\n"
-    )
-    folder = f"/run/systemd/system/{SERVICE}.d"
-    lab.root("sh", "-c", f"mkdir -p {folder} && printf '{lines}' >{folder}/soon.conf")
-    lab.root("systemctl", "daemon-reload")

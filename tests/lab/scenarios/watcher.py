@@ -97,17 +97,6 @@ def the_daemon_may_be_stopped(lab):
     _wait_for(lab, ["+", "-"])
 
 
-def pcscd_is_left_alone_when_nobody_watches_any_more(lab):
-    _watch(lab)
-    lab.insert("rsa")
-    _wait_for(lab, ["+"])
-    check.assertTrue(_instance_uses_pcscd(lab))
-
-    lab.user("alice", "systemctl", "--user", "stop", "watch.service")
-
-    lab.wait_until("pcscd is let go", lambda: not _instance_uses_pcscd(lab))
-
-
 def _watch(lab) -> None:
     # Without software tokens, which are looked at now and then, nothing but events tells.
     lab.root("rm", "/usr/share/p11-kit/modules/softhsm2.module")
@@ -128,8 +117,3 @@ def _told(lab) -> list[str]:
 
 def _wait_for(lab, signs: list[str], seconds: float = 20) -> None:
     lab.wait_until(f"{signs} is told", lambda: [line[0] for line in _told(lab)] == signs, seconds)
-
-
-def _instance_uses_pcscd(lab) -> bool:
-    threads = "ls /proc/$(systemctl --user show vlmhintsd --property=MainPID --value)/task"
-    return len(lab.user("alice", "sh", "-c", threads).output.split()) > 1

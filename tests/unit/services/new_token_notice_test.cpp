@@ -61,6 +61,28 @@ TEST_F(NewTokenNoticeTest, IsPostedAgainForATokenThatComesBack) {
     EXPECT_EQ(posts, 2);
 }
 
+TEST_F(NewTokenNoticeTest, IsPostedAgainForATokenThatIsPulledAndPutBackAtOnce) {
+    notice.looked({"a"}, true);
+    notice.cardPulled();
+    notice.looked({"a"}, false);
+    notice.looked({}, false);
+
+    notice.looked({"a"}, false);
+
+    EXPECT_EQ(posts, 2);
+}
+
+TEST_F(NewTokenNoticeTest, BelievesThatACardWasPulledUntilItIsCertainWhich) {
+    notice.looked({"a", "b"}, true);
+    notice.cardPulled();
+    notice.looked({"a"}, true);
+    notice.looked({}, false);
+
+    notice.looked({"a"}, true);
+
+    EXPECT_EQ(posts, 2);
+}
+
 TEST_F(NewTokenNoticeTest, IsPostedForTheOneThatComesOnly) {
     notice.looked({"a"}, true);
 

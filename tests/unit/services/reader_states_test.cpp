@@ -38,6 +38,34 @@ TEST_F(ReaderStatesTest, ACardThatWasThereForAMomentOnlyIsAnEvent) {
     EXPECT_TRUE(states.takeCardEvent());
 }
 
+TEST_F(ReaderStatesTest, ACardThatLeavesAReaderIsPulled) {
+    states.see("reader", after(1, SCARD_STATE_PRESENT));
+    EXPECT_FALSE(states.takeCardPulled());
+
+    states.see("reader", after(2, SCARD_STATE_EMPTY));
+
+    EXPECT_TRUE(states.takeCardPulled());
+    EXPECT_FALSE(states.takeCardPulled());
+}
+
+TEST_F(ReaderStatesTest, ACardThatIsBackBeforeAnybodyLooksWasPulled) {
+    states.see("reader", after(1, SCARD_STATE_PRESENT));
+
+    states.see("reader", after(3, SCARD_STATE_PRESENT));
+
+    EXPECT_TRUE(states.takeCardPulled());
+}
+
+TEST_F(ReaderStatesTest, ACardThatGoesWithItsReaderIsNotPulled) {
+    states.see("reader", after(1, SCARD_STATE_PRESENT));
+
+    states.see("reader", SCARD_STATE_UNKNOWN | SCARD_STATE_UNAVAILABLE);
+    states.setReaders({});
+
+    EXPECT_FALSE(states.takeCardPulled());
+    EXPECT_TRUE(states.takeCardEvent());
+}
+
 TEST_F(ReaderStatesTest, ACardThatIsUsedIsNoEvent) {
     states.see("reader", after(1, SCARD_STATE_PRESENT));
     states.takeCardEvent();
