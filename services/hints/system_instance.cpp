@@ -14,6 +14,8 @@
 #include "services/hints/hints_service.h"
 #include "services/hints/idleness.h"
 #include "services/hints/instances.h"
+#include "services/hints/logind_caller_sessions.h"
+#include "services/hints/polkit_authority.h"
 #include "services/hints/prompter_registry.h"
 #include "services/hints/service_names.h"
 #include "services/hints/sqlite_pairing_store.h"
@@ -96,11 +98,12 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     WorkerTokens cards(loop.get(), workersFor(options));
     CountedTokens tokens(cards, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
+    LogindCallerSessions sessions(connection);
+    PolkitAuthority polkit(connection);
+    AdministratorRight right(polkit);
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
-                          .pairings = **pairings,
-                          .callers = callers,
-                          .proofs = proofs,
-                          .now = secondsNow});
+                          .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
+                          .callers = callers});
     CountedExchanges requests(service, idleness);
     BusServer server(connection, kHintsInterface, "Exchange", requests);
 

@@ -85,7 +85,7 @@ def an_ordinary_user_may_list_and_not_pair(lab):
     check.assertEqual(lab.asked("pinentry"), [])
 
 
-def an_ordinary_user_does_not_unpair(lab):
+def an_ordinary_user_does_not_unpair_without_an_administrator(lab):
     hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
@@ -93,6 +93,7 @@ def an_ordinary_user_does_not_unpair(lab):
         refused = lab.user(user, "vlmbind", "-r", "-u", "alice", "-h", hash_)
         check.assertEqual(refused.status, 255, refused)
         check.assertIn(f"Cannot unpair user (public key hash: {hash_}).", refused.output)
+    check.assertEqual(len(lab.asked("polkit")), 1)
     check.assertIn("alice", lab.root("vlmctl", "pairings").output)
 
 

@@ -285,10 +285,8 @@ TEST_F(LoginTest, GivesTheCardNoPinWhenThereIsNothingToChallengeItWith) {
     fakes::FakeTokens cards;
     cards.insert(tokenOf("pkcs11:token=a", "PIV Card", {identityOf(1, "Alice")}));
     HintsService poor{{.login = {cards, prompt, {}, [](std::size_t) { return std::nullopt; }},
-                       .pairings = pairings,
-                       .callers = callers,
-                       .proofs = proofs,
-                       .now = [] { return kNow; }}};
+                       .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
+                       .callers = callers}};
     platform::Message reply;
 
     poor.handle(root(), loginWithPin(1, "123456"),
