@@ -23,7 +23,7 @@ const char* whyNotAsked(SessionState state) {
             break;
         case SessionState::None:
             return "an administrator has to allow this, and the program runs in no session of its "
-                   "user in which anybody could be asked.";
+                   "user in which one could be asked. Run the command with sudo if you are one.";
         case SessionState::Away:
             return "an administrator has to allow this, and is only asked at this machine, not "
                    "from afar. Run the command with sudo if you are one.";

@@ -42,6 +42,7 @@ TEST_F(LoginTest, AsksForThePinAndNamesCardAndIdentity) {
     EXPECT_EQ(prompt.questions[0].card, "PIV Card");
     EXPECT_EQ(prompt.questions[0].identity, "Alice");
     EXPECT_EQ(prompt.questions[0].state, PinState::Ready);
+    EXPECT_EQ(prompt.questions[0].account, "alice");
     EXPECT_EQ(prompt.questions[0].caller.user, 1000u);
 
     prompt.enter("123456");
