@@ -93,10 +93,13 @@ public:
                 answer(failed("nobody answered in time"));
             });
         } else {
-            auto reason = platform::text("the message cannot be sent ({})", std::strerror(-code));
-            _time = callSoon(sd_bus_get_event(_bus),
-                             [this, why = std::move(reason)] { answer(failed(why)); });
+            fail(platform::text("the message cannot be sent ({})", std::strerror(-code)));
         }
+    }
+
+    void fail(std::string reason) {
+        _time = callSoon(sd_bus_get_event(_bus),
+                         [this, why = std::move(reason)] { answer(failed(why)); });
     }
 
 private:
@@ -152,7 +155,10 @@ std::unique_ptr<Authority::Question> PolkitAuthority::ask(const RightQuestion& q
                                                           Answer answer) {
     auto asked =
         std::make_unique<PolkitQuestion>(_bus, std::to_string(++_lastQuestion), std::move(answer));
-    asked->start(question, _patience);
+    if (_isEnding)
+        asked->fail("the service was about to end after a quiet time");
+    else
+        asked->start(question, _patience);
     return asked;
 }
 

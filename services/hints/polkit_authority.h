@@ -27,10 +27,14 @@ public:
 
     std::unique_ptr<Question> ask(const RightQuestion& question, Answer answer) override;
 
+    // From now on, because the daemon is about to end. Open questions stay.
+    void askNobody() { _isEnding = true; }
+
 private:
     sd_bus* _bus;
     const std::chrono::milliseconds _patience;
     std::uint64_t _lastQuestion = 0;
+    bool _isEnding = false;
 };
 
 }  // namespace vlm::service

@@ -70,14 +70,16 @@ Idleness::Parts idlenessOf(sd_event* event, const Options& options, const Proofs
                 }};
 }
 
-// Whoever asks from now on starts the service anew; what came before is still answered. A PIN
-// prompt would keep the new one waiting for as long as a person takes.
-void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, Idleness& idleness) {
+// Whoever asks from now on starts the service anew; what came before is still answered. A question
+// to a person would keep the new one waiting for as long as that person takes.
+void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, PolkitAuthority& polkit,
+           Idleness& idleness) {
     kLog.info("leaving after a quiet time");
     // First, so that systemd neither ends this process for the loss of its name nor takes it for
     // the one that serves.
     sd_notify(0, "STOPPING=1");
     prompt.askNobody();
+    polkit.askNobody();
     bus.release([&] { idleness.callWhenDone([&] { loop.end(); }); });
 }
 
@@ -109,7 +111,7 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
 
     if (!server.start() || !prompters.start()) return {"the bus does not take the service"};
     if (auto reason = (*bus)->claim(kDaemonName); !reason.empty()) return {reason};
-    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, idleness); });
+    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, polkit, idleness); });
     return {{}, loop.run()};
 }
 

@@ -236,6 +236,18 @@ TEST_F(PolkitAuthorityTest, WaitsForNobodyForEver) {
     EXPECT_THAT(polkit->cancelled, ElementsAre(polkit->checks.at(0).id));
 }
 
+TEST_F(PolkitAuthorityTest, AsksNobodyAnyMoreWhenTheServiceIsAboutToEnd) {
+    askAndWait(authority);
+    authority.askNobody();
+
+    ask(authority);
+
+    EXPECT_EQ(verdict().outcome, Outcome::Failed);
+    EXPECT_THAT(verdict().reason, HasSubstr("about to end"));
+    EXPECT_EQ(polkit->checks.size(), 1u);
+    EXPECT_THAT(polkit->cancelled, IsEmpty());
+}
+
 TEST_F(PolkitAuthorityTest, FailsWhenPolkitEndsBeforeItAnswers) {
     askAndWait(authority);
 
