@@ -5,9 +5,8 @@
 #include <utility>
 
 #include "platform/accounts.h"
-#include "platform/harmless_text.h"
 #include "platform/platform.h"
-#include "platform/text.h"
+#include "services/hints/account_spelling.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/permission.h"
 #include "services/hints/reply.h"
@@ -20,19 +19,6 @@ namespace {
 
 using platform::Message;
 using platform::PropertyList;
-
-// The name as the account database spells it, which may differ from how a person does; none when
-// there is no such account.
-std::optional<std::string> spelling(const std::string& account) {
-    auto& accounts = platform::current().accounts();
-    const auto id = accounts.userId(account);
-    if (!id) return std::nullopt;
-    return accounts.userName(*id).value_or(account);
-}
-
-Refusal refused(platform::Status status, const Request& request, std::string_view why) {
-    return {status, platform::text("{}: {}", describe(request), why)};
-}
 
 std::set<Bytes> hashesOn(const std::vector<Token>& tokens) {
     std::set<Bytes> hashes;
@@ -73,9 +59,8 @@ void HintsService::serve(const Caller& caller, Request request, const Answer& an
         case Operation::TokenInfo:
             return describeTokens(caller, request, answer);
         case Operation::Pair:
-            return answer(pair(caller, request));
         case Operation::Unpair:
-            return answer(unpair(caller, request));
+            return changePairing(caller, std::move(request), answer);
         case Operation::Pairings:
             return listPairings(request, answer);
         case Operation::IsPaired:
@@ -87,21 +72,45 @@ void HintsService::serve(const Caller& caller, Request request, const Answer& an
 }
 
 void HintsService::login(const Caller& caller, Request request, const Answer& answer) {
-    const auto number = ++_lastLogin;
-    auto watch = _parts.callers.watch(caller.connection, [this, number] { _logins.erase(number); });
-    if (!watch) return;
-    const auto hash = request.hash;
-    const auto done = [this, number, user = caller.user, hash,
+    const auto number = begin(caller);
+    if (!number) return;
+    const auto done = [this, number = *number, user = caller.user, hash = request.hash,
                        answer](const std::optional<Refusal>& refusal) {
-        if (!refusal) _parts.proofs.remember(user, hash);
-        // Last the answer: it may be the last thing that this service does.
-        const auto ended = _logins.extract(number);
-        if (refusal) return answer(*refusal);
-        answer(numberReply(status::kSuccess));
+        if (!refusal) _parts.changes.proofs.remember(user, hash);
+        end(number, refusal, answer);
     };
     const auto login = std::make_shared<Login>(_parts.login, caller, std::move(request), done);
-    _logins[number] = {login, std::move(watch)};
+    _running[*number].work = login;
     login->start();
+}
+
+void HintsService::changePairing(const Caller& caller, Request request, const Answer& answer) {
+    const auto number = begin(caller);
+    if (!number) return;
+    const auto done = [this, number = *number, answer](const std::optional<Refusal>& refusal) {
+        end(number, refusal, answer);
+    };
+    const auto change =
+        std::make_shared<PairingChange>(_parts.changes, caller, std::move(request), done);
+    _running[*number].work = change;
+    change->start();
+}
+
+std::optional<std::uint64_t> HintsService::begin(const Caller& caller) {
+    const auto number = ++_last;
+    auto watch =
+        _parts.callers.watch(caller.connection, [this, number] { _running.erase(number); });
+    if (!watch) return std::nullopt;
+    _running[number].watch = std::move(watch);
+    return number;
+}
+
+// Last the answer: it may be the last thing that this service does.
+void HintsService::end(std::uint64_t number, const std::optional<Refusal>& refusal,
+                       const Answer& answer) {
+    const auto ended = _running.extract(number);
+    if (refusal) return answer(*refusal);
+    answer(numberReply(status::kSuccess));
 }
 
 void HintsService::describeTokens(const Caller& caller, const Request& request,
@@ -121,46 +130,19 @@ Outcome<Message> HintsService::describeTokens(const Caller& caller, const std::s
                                               const std::vector<Token>& tokens) {
     PairingsByHash pairings;
     for (const auto& hash : hashesOn(tokens)) {
-        auto found = _parts.pairings.pairingsWith(hash);
+        auto found = _parts.changes.pairings.pairingsWith(hash);
         if (!found) return found.refusal();
         if (!found->empty()) pairings[hash] = std::move(*found);
     }
-    TokenInfoRequest request{.onlyToken = onlyToken, .now = _parts.now()};
+    TokenInfoRequest request{.onlyToken = onlyToken, .now = _parts.changes.now()};
     if (!caller.isRoot())
         request.onlyAccount = platform::current().accounts().userName(caller.user).value_or("");
     return tokenInfoReply(tokenInfo(tokens, pairings, request));
 }
 
-Outcome<Message> HintsService::pair(const Caller& caller, const Request& request) {
-    const auto account = spelling(request.account);
-    if (!account) return refused(status::kNoSuchAccount, request, "there is no such account.");
-    if (!_parts.proofs.hold(caller.user, request.hash))
-        return refused(status::kNotProved, request,
-                       "a card has to sign with this key first. Log in with the card, and pair "
-                       "within a minute.");
-    if (const auto failure = _parts.pairings.pair(*account, request.hash, _parts.now()))
-        return *failure;
-    _parts.proofs.useUp(caller.user, request.hash);
-    kLog.notice("paired {} with {} for user {}", platform::harmlessText(*account),
-                platform::hexadecimal(request.hash), caller.user);
-    return numberReply(status::kSuccess);
-}
-
-Outcome<Message> HintsService::unpair(const Caller& caller, const Request& request) {
-    // An account that is gone, or is spelled differently now, can still be unpaired.
-    const auto account = spelling(request.account).value_or(request.account);
-    auto wasThere = _parts.pairings.unpair(account, request.hash);
-    if (wasThere && !*wasThere && account != request.account)
-        wasThere = _parts.pairings.unpair(request.account, request.hash);
-    if (!wasThere) return wasThere.refusal();
-    if (!*wasThere) return refused(status::kNotPaired, request, "they are not paired.");
-    kLog.notice("unpaired {} from {} for user {}", platform::harmlessText(account),
-                platform::hexadecimal(request.hash), caller.user);
-    return numberReply(status::kSuccess);
-}
-
 void HintsService::listPairings(const Request& request, const Answer& answer) {
-    auto pairings = _parts.pairings.pairingsOf(spelling(request.account).value_or(request.account));
+    auto pairings =
+        _parts.changes.pairings.pairingsOf(spelling(request.account).value_or(request.account));
     if (!pairings) return answer(pairings.refusal());
     if (!request.insertedOnly) return answer(pairingsReply(*pairings, nullptr));
     _parts.login.tokens.list(
@@ -172,7 +154,7 @@ void HintsService::listPairings(const Request& request, const Answer& answer) {
 
 Outcome<Message> HintsService::isPaired(const Request& request) {
     const auto answer =
-        _parts.pairings.isPaired(spelling(request.account).value_or(request.account));
+        _parts.changes.pairings.isPaired(spelling(request.account).value_or(request.account));
     if (!answer) return answer.refusal();
     return numberReply(*answer ? 1 : 0);
 }

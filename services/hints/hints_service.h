@@ -12,13 +12,13 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <vector>
 
 #include "services/hints/caller.h"
 #include "services/hints/exchanges.h"
 #include "services/hints/login.h"
-#include "services/hints/pairing_store.h"
-#include "services/hints/proofs.h"
+#include "services/hints/pairing_change.h"
 #include "services/hints/token_info.h"
 
 namespace vlm::service {
@@ -27,10 +27,8 @@ class HintsService final : public Exchanges {
 public:
     struct Parts {
         LoginParts login;
-        PairingStore& pairings;
+        PairingChangeParts changes;
         CallerWatch& callers;
-        Proofs& proofs;
-        std::function<std::int64_t()> now;  // seconds since 1970-01-01 00:00:00 UTC
     };
 
     explicit HintsService(Parts parts) : _parts(std::move(parts)) {}
@@ -38,9 +36,9 @@ public:
     void handle(const Caller& caller, const IncomingRequest& request, Reply reply) override;
 
 private:
-    // A login under way, and the watch that ends it when its caller leaves.
+    // A login or a change under way, and the watch that ends it when its caller leaves.
     struct Running {
-        std::shared_ptr<Login> login;
+        std::shared_ptr<void> work;
         std::unique_ptr<CallerWatch::Watch> watch;
     };
     using Answer = std::function<void(Outcome<platform::Message>)>;
@@ -50,14 +48,17 @@ private:
     void describeTokens(const Caller& caller, const Request& request, const Answer& answer);
     Outcome<platform::Message> describeTokens(const Caller& caller, const std::string& onlyToken,
                                               const std::vector<Token>& tokens);
-    Outcome<platform::Message> pair(const Caller& caller, const Request& request);
-    Outcome<platform::Message> unpair(const Caller& caller, const Request& request);
+    void changePairing(const Caller& caller, Request request, const Answer& answer);
     void listPairings(const Request& request, const Answer& answer);
     Outcome<platform::Message> isPaired(const Request& request);
 
+    // The number of what begins for the caller; none when the caller has left.
+    std::optional<std::uint64_t> begin(const Caller& caller);
+    void end(std::uint64_t number, const std::optional<Refusal>& refusal, const Answer& answer);
+
     Parts _parts;
-    std::map<std::uint64_t, Running> _logins;
-    std::uint64_t _lastLogin = 0;
+    std::map<std::uint64_t, Running> _running;
+    std::uint64_t _last = 0;
 
     // Answers that come after the service is gone find this gone, too.
     std::shared_ptr<int> _alive = std::make_shared<int>();

@@ -3,7 +3,9 @@
 #include <algorithm>
 #include <utility>
 
+#include "platform/accounts.h"
 #include "platform/harmless_text.h"
+#include "platform/platform.h"
 #include "platform/text.h"
 #include "services/hints/status.h"
 
@@ -64,7 +66,10 @@ void Login::choose(const std::vector<Token>& tokens) {
 }
 
 void Login::askForPin() {
-    const PinQuestion question{_token.name, _identity.name, _token.pinState, _caller};
+    PinQuestion question{_token.name, _identity.name, _token.pinState, {}, _caller};
+    // The proof serves a pairing, which is root's to choose; others pair themselves only.
+    if (!_caller.isRoot())
+        question.account = platform::current().accounts().userName(_caller.user).value_or("");
     _question = _parts.prompt.ask(question, [weak = weak_from_this()](PinAnswer answer) {
         if (const auto self = weak.lock()) self->takePin(std::move(answer));
     });

@@ -2,15 +2,20 @@
 
 #include "platform/accounts.h"
 #include "platform/platform.h"
-#include "platform/text.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
 
 namespace {
 
+bool changesPairing(const Request& request) {
+    return request.operation == Operation::Pair || request.operation == Operation::Unpair;
+}
+
 bool concernsCaller(const Caller& caller, const Request& request) {
     switch (request.operation) {
+        case Operation::Pair:
+        case Operation::Unpair:
         case Operation::Pairings:
         case Operation::IsPaired:
             return platform::current().accounts().userId(request.account) == caller.user;
@@ -19,23 +24,20 @@ bool concernsCaller(const Caller& caller, const Request& request) {
     }
 }
 
-Refusal notPermitted(const Request& request, std::string_view why) {
-    return {status::kNotPermitted, platform::text("{}: {}", describe(request), why)};
-}
-
 }  // namespace
 
 std::optional<Refusal> refusalFor(const Caller& caller, const Request& request) {
-    if (caller.isRoot()) return std::nullopt;
-    if (request.operation == Operation::Pair || request.operation == Operation::Unpair)
-        return notPermitted(request,
-                            "an administrator has to do this. Ask one, or run the command with "
-                            "sudo if you are one.");
-    if (!concernsCaller(caller, request))
-        return notPermitted(request,
-                            "only an administrator may ask about another account. Ask about your "
-                            "own, or run the command with sudo if you are one.");
-    return std::nullopt;
+    if (caller.isRoot() || concernsCaller(caller, request)) return std::nullopt;
+    return refused(status::kNotPermitted, request,
+                   changesPairing(request)
+                       ? "only root may do this for another account. Ask an administrator, or run "
+                         "the command with sudo if you are one."
+                       : "only an administrator may ask about another account. Ask about your own, "
+                         "or run the command with sudo if you are one.");
+}
+
+bool needsAdministrator(const Caller& caller, const Request& request) {
+    return !caller.isRoot() && changesPairing(request);
 }
 
 }  // namespace vlm::service

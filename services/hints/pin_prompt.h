@@ -26,7 +26,8 @@ struct PinQuestion {
     std::string card;  // names as people know them, harmless as tokens.h promises
     std::string identity;
     PinState state = PinState::Ready;
-    Caller caller;  // for whom; the person in front of this program is asked
+    std::string account;  // that can be paired then; empty when it may be any
+    Caller caller;        // for whom; the person in front of this program is asked
 };
 
 struct PinAnswer {

@@ -15,8 +15,9 @@ namespace {
 
 using namespace std::chrono_literals;
 
-// The program keeps the time itself; this is for one that does not.
-constexpr auto kPatience = std::chrono::seconds(PinentryDialog::kPatienceSeconds) + 10s;
+// The program keeps the time itself, for the warning and for the PIN; this is for one that does
+// not.
+constexpr auto kPatience = 2 * std::chrono::seconds(PinentryDialog::kPatienceSeconds) + 10s;
 
 // How long a program may take to put its window away.
 constexpr auto kFarewell = 1s;

@@ -12,11 +12,16 @@ namespace {
 
 // The protocol allows lines of 1000 bytes; this many characters of a name fit beside the rest.
 constexpr std::size_t kMostNameCharacters = 64;
+constexpr std::size_t kMostAccountCharacters = 32;
+
+constexpr const char* kConfirm = "CONFIRM";
+constexpr const char* kGetPin = "GETPIN";
 
 // The low half of an error number is the error, the rest tells which program made it.
 constexpr unsigned kErrorMask = 0xFFFF;
 constexpr unsigned kTimedOut = 62;
 constexpr unsigned kCancelled = 99;
+constexpr unsigned kNotConfirmed = 114;
 constexpr unsigned kFullyCancelled = 198;
 
 std::string escaped(std::string_view text) {
@@ -34,10 +39,14 @@ std::string escaped(std::string_view text) {
     return line;
 }
 
+std::string shownCard(const PinQuestion& question) {
+    return platform::harmlessText(question.card, kMostNameCharacters);
+}
+
 std::string_view warning(PinState state) {
     switch (state) {
         case PinState::FewTriesLeft:
-            return "\n\nA wrong PIN was entered before.";
+            return "\n\nA wrong PIN was entered before, and only a few tries are left.";
         case PinState::LastTry:
             return "\n\nThis is the last try: after another wrong PIN the card is locked.";
         case PinState::Ready:
@@ -48,11 +57,23 @@ std::string_view warning(PinState state) {
 }
 
 std::string description(const PinQuestion& question) {
+    const auto whose =
+        question.account.empty()
+            ? std::string("an account")
+            : "the account " + platform::harmlessText(question.account, kMostAccountCharacters);
     return platform::text(
         "Enter the PIN of the card \"{}\". The card then proves that it holds the identity "
-        "\"{}\".{}",
-        platform::harmlessText(question.card, kMostNameCharacters),
-        platform::harmlessText(question.identity, kMostNameCharacters), warning(question.state));
+        "\"{}\", so that it can be paired with {}.{}",
+        shownCard(question), platform::harmlessText(question.identity, kMostNameCharacters), whose,
+        warning(question.state));
+}
+
+std::string lastTryWarning(const PinQuestion& question) {
+    return platform::text(
+        "The PIN of the card \"{}\" was entered wrongly before, and only one try is left. After "
+        "another wrong PIN the card is locked, and whoever issued it has to unlock it.\n\nDo you "
+        "know the PIN for certain, and want to enter it?",
+        shownCard(question));
 }
 
 // One word of a line, taken off its head.
@@ -81,9 +102,13 @@ PinentryDialog::PinentryDialog(const PinQuestion& question,
     _commands.push_back("OPTION lc-ctype=C.UTF-8");
     _commands.push_back(platform::text("SETTIMEOUT {}", kPatienceSeconds));
     _commands.push_back("SETTITLE Smart card");
+    if (question.state == PinState::LastTry) {
+        _commands.push_back("SETDESC " + escaped(lastTryWarning(question)));
+        _commands.emplace_back(kConfirm);
+    }
     _commands.push_back("SETDESC " + escaped(description(question)));
     _commands.push_back("SETPROMPT PIN:");
-    _commands.push_back("GETPIN");
+    _commands.emplace_back(kGetPin);
 }
 
 PinentryDialog::~PinentryDialog() { wipeMemory(_pin); }
@@ -99,8 +124,10 @@ std::string PinentryDialog::take(std::string_view line) {
             "the PIN that was entered is too long");
     }
     if (word == "ERR") {
-        // A program that does not know an option asks all the same.
-        if (!isAsked && _sent > 0) return next();
+        // A program that does not know an option asks all the same; but not what it must not ask
+        // without a yes.
+        const bool isConfirming = _sent > 0 && _commands[_sent - 1] == kConfirm;
+        if (!isAsked && _sent > 0 && !isConfirming) return next();
         endWithError(line);
     }
     if (word == "INQUIRE") return "CAN\n";
@@ -154,6 +181,7 @@ void PinentryDialog::endWithError(std::string_view error) {
     switch (number & kErrorMask) {
         case kCancelled:
         case kFullyCancelled:
+        case kNotConfirmed:
             return end(PinAnswer::Outcome::Cancelled);
         case kTimedOut:
             return end(PinAnswer::Outcome::TimedOut);

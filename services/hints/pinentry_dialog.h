@@ -1,7 +1,8 @@
 // PinentryDialog: our side of the conversation with a pinentry program, line by line (the Assuan
 // protocol: commands answered by "OK", "ERR number text" or "D data" before them).
 //
-// What the program says is bounded, and what it says of the PIN is wiped.
+// Before a last try the person is warned, and has to say yes, before the PIN is asked for. What the
+// program says is bounded, and what it says of the PIN is wiped.
 //
 // Threads: one. Errors: an answer with the reason.
 // In tests: tests/unit/services/pinentry_dialog_test.cpp
@@ -25,7 +26,7 @@ struct PinentryTerminal {
 
 class PinentryDialog {
 public:
-    // A person who is away is not waited for longer.
+    // A person who is away is not waited for longer, each time that something is asked.
     static constexpr int kPatienceSeconds = 120;
 
     // Without a terminal the program asks on a desktop.

@@ -25,6 +25,7 @@ platform::Message writeQuestion(const PinQuestion& question) {
     message.set("card", question.card);
     message.set("identity", question.identity);
     message.set("state", static_cast<std::uint64_t>(question.state));
+    message.set("account", question.account);
     return message;
 }
 
@@ -32,10 +33,12 @@ std::optional<PinQuestion> readQuestion(const platform::Message& message) {
     const auto* card = message.text("card");
     const auto* identity = message.text("identity");
     const auto state = message.unsignedInteger("state");
-    if (!card || !identity || !state || card->size() > kMostName || identity->size() > kMostName ||
+    const auto* account = message.text("account");
+    const auto isName = [](const std::string* text) { return text && text->size() <= kMostName; };
+    if (!isName(card) || !isName(identity) || !isName(account) || !state ||
         *state > static_cast<std::uint64_t>(PinState::Locked))
         return std::nullopt;
-    return PinQuestion{*card, *identity, static_cast<PinState>(*state), {}};
+    return PinQuestion{*card, *identity, static_cast<PinState>(*state), *account, {}};
 }
 
 platform::Message writeAnswer(const PinAnswer& answer) {

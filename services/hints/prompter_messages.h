@@ -1,7 +1,7 @@
 // The dictionaries of AskPin(): the question of the daemon, and the answer of a user's instance.
 //
-// Question: "card" and "identity" text, "state" the card's PinState as an unsigned number.
-// Answer:   "res" 0 and "pin"; or "res" a status and an error entry.
+// Question: "card", "identity" and "account" text, "state" the card's PinState as an unsigned
+// number. Answer:   "res" 0 and "pin"; or "res" a status and an error entry.
 //
 // Errors:   a dictionary that is not like this is none.
 // In tests: tests/unit/services/prompter_messages_test.cpp

@@ -202,4 +202,8 @@ std::string describe(const Request& request) {
     return {};
 }
 
+Refusal refused(platform::Status status, const Request& request, std::string_view why) {
+    return {status, platform::text("{}: {}", describe(request), why)};
+}
+
 }  // namespace vlm::service

@@ -11,6 +11,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "platform/types.h"
 #include "services/hints/exchanges.h"
@@ -45,5 +46,8 @@ Outcome<Request> readRequest(const IncomingRequest& incoming);
 
 // What the request asks for, as the beginning of a sentence that says why it was not done.
 std::string describe(const Request& request);
+
+// That sentence.
+Refusal refused(platform::Status status, const Request& request, std::string_view why);
 
 }  // namespace vlm::service

@@ -21,4 +21,7 @@ inline constexpr const char* kPrompterInterface = "org.vlm.token.hints.Prompter"
 // The agent's, for programs that watch tokens: Watch() -> as; signals Inserted(s) and Removed(s)
 inline constexpr const char* kTokensInterface = "org.vlm.token.hints.Tokens";
 
+// The right that changes one's own pairings, as polkit knows it: resources/polkit/
+inline constexpr const char* kAdministratorRight = "org.vlm.vlmbind.admin";
+
 }  // namespace vlm::service

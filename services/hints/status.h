@@ -17,14 +17,16 @@ inline constexpr Status kNoSuchAccount = -2003;
 inline constexpr Status kNoSuchToken = -2004;  // the token is not inserted
 inline constexpr Status kNoSuchKey = -2005;    // the token holds no such identity that can sign
 inline constexpr Status kNoPin = -2006;        // no PIN was given and nobody could be asked
-inline constexpr Status kCancelled = -2007;    // the person dismissed the PIN prompt, or left it
+inline constexpr Status kCancelled = -2007;    // the person dismissed what was asked, or left it
 inline constexpr Status kPinIncorrect = -2008;
 inline constexpr Status kPinLocked = -2009;
 inline constexpr Status kCardFailed = -2010;  // the card, its reader or its module failed
 inline constexpr Status kNotProved = -2011;   // no valid signature by the key was given
 inline constexpr Status kNotPaired = -2012;
-inline constexpr Status kStoreFailed = -2013;  // the pairings could not be read or written
-inline constexpr Status kUnreachable = -2014;  // the daemon does not answer the user's instance
-inline constexpr Status kBusy = -2015;         // too many requests wait for an answer already
+inline constexpr Status kStoreFailed = -2013;   // the pairings could not be read or written
+inline constexpr Status kUnreachable = -2014;   // the daemon does not answer the user's instance
+inline constexpr Status kBusy = -2015;          // too many requests wait for an answer already
+inline constexpr Status kUnattended = -2016;    // nobody can be asked in the caller's session
+inline constexpr Status kRightUnknown = -2017;  // whether an administrator allows it is not known
 
 }  // namespace vlm::service::status

@@ -14,6 +14,8 @@
 #include "services/hints/hints_service.h"
 #include "services/hints/idleness.h"
 #include "services/hints/instances.h"
+#include "services/hints/logind_caller_sessions.h"
+#include "services/hints/polkit_authority.h"
 #include "services/hints/prompter_registry.h"
 #include "services/hints/service_names.h"
 #include "services/hints/sqlite_pairing_store.h"
@@ -68,14 +70,16 @@ Idleness::Parts idlenessOf(sd_event* event, const Options& options, const Proofs
                 }};
 }
 
-// Whoever asks from now on starts the service anew; what came before is still answered. A PIN
-// prompt would keep the new one waiting for as long as a person takes.
-void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, Idleness& idleness) {
+// Whoever asks from now on starts the service anew; what came before is still answered. A question
+// to a person would keep the new one waiting for as long as that person takes.
+void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, PolkitAuthority& polkit,
+           Idleness& idleness) {
     kLog.info("leaving after a quiet time");
     // First, so that systemd neither ends this process for the loss of its name nor takes it for
     // the one that serves.
     sd_notify(0, "STOPPING=1");
     prompt.askNobody();
+    polkit.askNobody();
     bus.release([&] { idleness.callWhenDone([&] { loop.end(); }); });
 }
 
@@ -96,17 +100,18 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     WorkerTokens cards(loop.get(), workersFor(options));
     CountedTokens tokens(cards, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
+    LogindCallerSessions sessions(connection);
+    PolkitAuthority polkit(connection);
+    AdministratorRight right(polkit);
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
-                          .pairings = **pairings,
-                          .callers = callers,
-                          .proofs = proofs,
-                          .now = secondsNow});
+                          .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
+                          .callers = callers});
     CountedExchanges requests(service, idleness);
     BusServer server(connection, kHintsInterface, "Exchange", requests);
 
     if (!server.start() || !prompters.start()) return {"the bus does not take the service"};
     if (auto reason = (*bus)->claim(kDaemonName); !reason.empty()) return {reason};
-    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, idleness); });
+    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, polkit, idleness); });
     return {{}, loop.run()};
 }
 

@@ -67,7 +67,7 @@ TEST_F(OrdinaryUser, CannotUnpairAndIsToldWhoCan) {
 
     EXPECT_EQ(refused.status, 255);
     EXPECT_THAT(refused.output, HasSubstr("Cannot unpair user (public key hash: " + hash + "). "));
-    EXPECT_THAT(refused.output, HasSubstr("an administrator has to do this"));
+    EXPECT_THAT(refused.output, HasSubstr("an administrator has to allow this"));
     EXPECT_THAT(machine.vlmbind({"-i"}).output, HasSubstr("nobody - Alice Example"));
 }
 

@@ -28,7 +28,7 @@ protected:
     }
 
     void ask() {
-        question = prompt.ask({"Card", "Alice", PinState::Ready, {0, 0, ":1.99"}},
+        question = prompt.ask({"Card", "Alice", PinState::Ready, "", {0, 0, ":1.99"}},
                               [this](PinAnswer given) { answer = std::move(given); });
     }
     // The bus knows a connection by the user who made it.

@@ -69,13 +69,13 @@ TEST_F(DaemonTest, TakesNoWrongPinForAProof) {
     EXPECT_THAT(machine.call(machine.pair(me)), StartsWith("res -2011"));
 }
 
-TEST_F(DaemonTest, LetsOthersAskAboutThemselvesAndPairNobody) {
+TEST_F(DaemonTest, LetsOthersAskAboutThemselvesAndPairNobodyElse) {
     machine.startDaemon();
     machine.insertCard();
     ASSERT_EQ(machine.call(machine.login({"str2=123456"})), "res 0\n");
     ASSERT_EQ(machine.call(machine.pair(me)), "res 0\n");
 
-    const auto pairing = machine.call(machine.pair("nobody"), kNobodyUser);
+    const auto pairing = machine.call(machine.pair(me), kNobodyUser);
     const auto asking = machine.call({"op=6", "str1=" + me}, kNobodyUser);
     const auto listing = machine.call({"op=1", "uid=-1"}, kNobodyUser);
 
@@ -84,6 +84,17 @@ TEST_F(DaemonTest, LetsOthersAskAboutThemselvesAndPairNobody) {
     EXPECT_EQ(machine.call({"op=6", "str1=nobody"}, kNobodyUser), "res 0\n");
     EXPECT_THAT(listing, testing::AllOf(HasSubstr("Alice Example"), HasSubstr("another account"),
                                         testing::Not(HasSubstr(me))));
+}
+
+TEST_F(DaemonTest, PairsOthersOnlyWhereAnAdministratorCanBeAsked) {
+    machine.startDaemon();
+    machine.insertCard();
+
+    EXPECT_THAT(machine.call(machine.pair("nobody"), kNobodyUser), StartsWith("res -2011\n"));
+    ASSERT_EQ(machine.call(machine.login({"str2=123456"}), kNobodyUser), "res 0\n");
+    EXPECT_THAT(machine.call(machine.pair("nobody"), kNobodyUser),
+                testing::AllOf(StartsWith("res -2016\n"), HasSubstr("in no session")));
+    EXPECT_EQ(machine.call({"op=6", "str1=nobody"}), "res 0\n");
 }
 
 TEST_F(DaemonTest, AnswersRequestsThatAreNone) {

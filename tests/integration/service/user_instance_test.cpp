@@ -217,9 +217,27 @@ TEST_F(UserInstanceTest, GivesNoPinToAnotherProgram) {
     start(machine.answeringPinentry());
     const std::string address = "--address=" + machine.systemBus().address();
     const auto ask = [&](std::optional<uid_t> user) {
-        return run({"busctl", address, "call", connectionOfTheAgent(), "/org/vlm/token/hints",
-                    "org.vlm.token.hints.Prompter", "AskPin", "a{sv}", "3", "card", "s", "Card",
-                    "identity", "s", "Alice", "state", "t", "0"},
+        return run({"busctl",
+                    address,
+                    "call",
+                    connectionOfTheAgent(),
+                    "/org/vlm/token/hints",
+                    "org.vlm.token.hints.Prompter",
+                    "AskPin",
+                    "a{sv}",
+                    "4",
+                    "card",
+                    "s",
+                    "Card",
+                    "identity",
+                    "s",
+                    "Alice",
+                    "state",
+                    "t",
+                    "0",
+                    "account",
+                    "s",
+                    ""},
                    machine.options(user));
     };
 

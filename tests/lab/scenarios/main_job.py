@@ -85,7 +85,7 @@ def an_ordinary_user_may_list_and_not_pair(lab):
     check.assertEqual(lab.asked("pinentry"), [])
 
 
-def an_ordinary_user_does_not_unpair(lab):
+def an_ordinary_user_does_not_unpair_without_an_administrator(lab):
     hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
@@ -93,6 +93,7 @@ def an_ordinary_user_does_not_unpair(lab):
         refused = lab.user(user, "vlmbind", "-r", "-u", "alice", "-h", hash_)
         check.assertEqual(refused.status, 255, refused)
         check.assertIn(f"Cannot unpair user (public key hash: {hash_}).", refused.output)
+    check.assertEqual(len(lab.asked("polkit")), 1)
     check.assertIn("alice", lab.root("vlmctl", "pairings").output)
 
 
@@ -102,7 +103,8 @@ def the_user_at_the_console_is_asked_for_the_pin(lab):
     pair(lab, "bob", hash_)
 
     (question,) = lab.asked("pinentry")
-    check.assertIn("Alice Archer", question["desc"])
+    check.assertIn('the card "Alice Archer"', question["desc"])
+    check.assertIn("can be paired with an account", question["desc"])
     check.assertEqual(question["prompt"], "PIN:")
 
 
@@ -117,6 +119,36 @@ def a_wrong_pin_is_tried_once_and_pairs_nobody(lab):
     check.assertIn(f"Cannot pair user (public key hash: {hash_}).", refused.output)
     check.assertIn("pin=2", lab.card_ctl("tries", "rsa"))
     check.assertNotIn(hash_, lab.root("vlmctl", "pairings").output)
+
+
+def before_the_last_try_the_person_has_to_say_yes(lab):
+    lab.card_ctl("set-tries", "rsa", "1")
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "dismiss")
+
+    check.assertEqual(pair(lab, "alice", hash_).status, 255)
+    (warning,) = lab.asked("pinentry")
+    check.assertIn("only one try is left", warning["warning"])
+
+    lab.answer("pinentry", "pin 123456")
+    check.assertEqual(pair(lab, "alice", hash_).status, 0)
+    check.assertEqual(["warning" in each for each in lab.asked("pinentry")], [True, True, False])
+
+
+def the_last_try_is_known_after_two_wrong_pins(lab):
+    lab.insert("rsa")
+    hash_ = only_identity(lab, "Alice Archer")
+    lab.answer("pinentry", "pin 000000")
+    for _ in range(2):
+        check.assertEqual(pair(lab, "alice", hash_).status, 255)
+    check.assertIn("pin=1", lab.card_ctl("tries", "rsa"))
+
+    lab.answer("pinentry", "dismiss")
+    check.assertEqual(pair(lab, "alice", hash_).status, 255)
+
+    check.assertIn("only one try is left", lab.asked("pinentry")[-1]["warning"])
+    check.assertIn("pin=1", lab.card_ctl("tries", "rsa"))
 
 
 def a_person_who_dismisses_the_question_costs_no_try(lab):

@@ -8,6 +8,8 @@
 #include <vector>
 
 #include "cards.h"
+#include "fake_authority.h"
+#include "fake_caller_sessions.h"
 #include "fake_caller_watch.h"
 #include "fake_pairing_store.h"
 #include "fake_pin_prompt.h"
@@ -34,13 +36,18 @@ protected:
     // The reply to a request, once the cards have answered; none when there is none yet.
     std::optional<platform::Message> ask(const Caller& caller, const IncomingRequest& request) {
         send(caller, request);
-        tokens.settle();
+        settle();
         return lastReply();
     }
     void send(const Caller& caller, const IncomingRequest& request) {
         _replies.clear();
         service.handle(caller, request,
                        [this](platform::Message reply) { _replies.push_back(std::move(reply)); });
+    }
+    // Lets machines answer; people do so when the test says it.
+    void settle() {
+        sessions.settle();
+        tokens.settle();
     }
     std::optional<platform::Message> lastReply() const {
         EXPECT_LE(_replies.size(), 1u) << "a request is answered once";
@@ -84,7 +91,10 @@ protected:
     fakes::FakePinPrompt prompt;
     fakes::FakePairingStore pairings;
     fakes::FakeCallerWatch callers;
+    fakes::FakeCallerSessions sessions;
+    fakes::FakeAuthority authority;
     Proofs proofs{[this] { return now; }};
+    AdministratorRight right{authority};
     std::uint8_t lastRandom = 0;
     HintsService service{{
         .login = {
@@ -93,10 +103,8 @@ protected:
                 return signature == fakes::FakeTokens::signature(hash, challenge);
             },
             [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
-        .pairings = pairings,
+        .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
         .callers = callers,
-        .proofs = proofs,
-        .now = [] { return kNow; },
     }};
 
 private:

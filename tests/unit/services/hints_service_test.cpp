@@ -20,7 +20,7 @@ TEST_F(HintsServiceTest, RefusesWhatIsNoRequestWithATextAndALogLine) {
 }
 
 TEST_F(HintsServiceTest, AsksThePermissionBeforeAnything) {
-    const auto reply = ask(alice(), pair("alice", 1));
+    const auto reply = ask(alice(), pair("bob", 1));
 
     EXPECT_EQ(result(reply), status::kNotPermitted);
     EXPECT_TRUE(pairings.all().empty());
@@ -321,11 +321,10 @@ TEST_F(HintsServiceTest, LetsGoOfAnswersThatComeAfterItIsGone) {
     fakes::FakeTokens cards;
     int replies = 0;
     {
-        HintsService shortLived{{.login = {cards, prompt, {}, {}},
-                                 .pairings = pairings,
-                                 .callers = callers,
-                                 .proofs = proofs,
-                                 .now = [] { return kNow; }}};
+        HintsService shortLived{
+            {.login = {cards, prompt, {}, {}},
+             .changes = {cards, pairings, proofs, sessions, right, [] { return kNow; }},
+             .callers = callers}};
         const auto count = [&](const platform::Message&) { ++replies; };
         shortLived.handle(root(), requestOf(1, {{"uid", signedNumber(-1)}}), count);
         shortLived.handle(root(), login(1), count);

@@ -42,6 +42,7 @@ TEST_F(LoginTest, AsksForThePinAndNamesCardAndIdentity) {
     EXPECT_EQ(prompt.questions[0].card, "PIV Card");
     EXPECT_EQ(prompt.questions[0].identity, "Alice");
     EXPECT_EQ(prompt.questions[0].state, PinState::Ready);
+    EXPECT_EQ(prompt.questions[0].account, "alice");
     EXPECT_EQ(prompt.questions[0].caller.user, 1000u);
 
     prompt.enter("123456");
@@ -285,10 +286,8 @@ TEST_F(LoginTest, GivesTheCardNoPinWhenThereIsNothingToChallengeItWith) {
     fakes::FakeTokens cards;
     cards.insert(tokenOf("pkcs11:token=a", "PIV Card", {identityOf(1, "Alice")}));
     HintsService poor{{.login = {cards, prompt, {}, [](std::size_t) { return std::nullopt; }},
-                       .pairings = pairings,
-                       .callers = callers,
-                       .proofs = proofs,
-                       .now = [] { return kNow; }}};
+                       .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
+                       .callers = callers}};
     platform::Message reply;
 
     poor.handle(root(), loginWithPin(1, "123456"),

@@ -47,10 +47,12 @@ constexpr Rule kRules[] = {
     {"list cards with nobody at the console", Operation::TokenInfo, "", kNobody, true},
     {"list cards for bob", Operation::TokenInfo, "", 1001, false},
     {"list cards for root", Operation::TokenInfo, "", 0, false},
-    {"pair herself", Operation::Pair, "alice", kNobody, false},
+    {"pair herself", Operation::Pair, "alice", kNobody, true},
     {"pair bob", Operation::Pair, "bob", kNobody, false},
-    {"unpair herself", Operation::Unpair, "alice", kNobody, false},
+    {"unpair herself", Operation::Unpair, "alice", kNobody, true},
     {"unpair bob", Operation::Unpair, "bob", kNobody, false},
+    {"pair nobody known", Operation::Pair, "mallory", kNobody, false},
+    {"unpair nobody known", Operation::Unpair, "mallory", kNobody, false},
     {"list her own pairings", Operation::Pairings, "alice", kNobody, true},
     {"list the pairings of bob", Operation::Pairings, "bob", kNobody, false},
     {"list the pairings of nobody known", Operation::Pairings, "mallory", kNobody, false},
@@ -64,7 +66,7 @@ constexpr Rule kRules[] = {
     {"watch the cards of bob", Operation::TokenEndpoints, "", 1001, false},
 };
 
-TEST_F(PermissionTest, LetsRootDoAllAndOthersAskAboutThemselves) {
+TEST_F(PermissionTest, LetsRootDoAllAndOthersWhatConcernsThemselves) {
     const Caller root{0, 1, ":1.1"};
     const Caller alice{kAlice, 2, ":1.2"};
     for (const auto& rule : kRules) {
@@ -79,12 +81,27 @@ TEST_F(PermissionTest, LetsRootDoAllAndOthersAskAboutThemselves) {
 }
 
 TEST_F(PermissionTest, TellsWhatWasRefusedAndThatAnAdministratorCanDoIt) {
-    const auto refusal = refusalFor({kAlice, 2, ":1.2"}, about(Operation::Pair, "alice", kNobody));
+    const auto refusal = refusalFor({kAlice, 2, ":1.2"}, about(Operation::Pair, "bob", kNobody));
 
     ASSERT_TRUE(refusal);
-    EXPECT_THAT(refusal->text, testing::StartsWith("Pairing alice with 0101"));
+    EXPECT_THAT(refusal->text, testing::StartsWith("Pairing bob with 0101"));
+    EXPECT_THAT(refusal->text, testing::HasSubstr("another account"));
     EXPECT_THAT(refusal->text, testing::HasSubstr("administrator"));
     EXPECT_THAT(refusal->text, testing::HasSubstr("sudo"));
+}
+
+TEST_F(PermissionTest, NeedsAnAdministratorForTheChangesOfOthersThanRoot) {
+    const Caller root{0, 1, ":1.1"};
+    const Caller alice{kAlice, 2, ":1.2"};
+    for (const auto& rule : kRules) {
+        SCOPED_TRACE(rule.why);
+        const auto request = about(rule.operation, rule.account, rule.user);
+        const bool isChange =
+            rule.operation == Operation::Pair || rule.operation == Operation::Unpair;
+
+        EXPECT_FALSE(needsAdministrator(root, request));
+        EXPECT_EQ(needsAdministrator(alice, request), isChange);
+    }
 }
 
 TEST_F(PermissionTest, TellsNobodyWhetherAnotherAccountExists) {

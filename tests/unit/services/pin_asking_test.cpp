@@ -19,7 +19,7 @@ protected:
     }
 
     static platform::Message question() {
-        return writeQuestion({"PIV Card", "Alice", PinState::LastTry, {}});
+        return writeQuestion({"PIV Card", "Alice", PinState::LastTry, "alice", {}});
     }
 
     const Caller daemon{0, 1, ":1.1"};
@@ -35,6 +35,7 @@ TEST_F(PinAskingTest, AsksForTheDaemon) {
     EXPECT_EQ(prompt.questions[0].card, "PIV Card");
     EXPECT_EQ(prompt.questions[0].identity, "Alice");
     EXPECT_EQ(prompt.questions[0].state, PinState::LastTry);
+    EXPECT_EQ(prompt.questions[0].account, "alice");
 
     prompt.enter("123456");
 

@@ -3,14 +3,21 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <iterator>
+
 namespace vlm::service {
 namespace {
 
 using Outcome = PinAnswer::Outcome;
+using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
+using testing::Not;
 
-PinQuestion question(PinState state = PinState::Ready) { return {"PIV Card", "Alice", state, {}}; }
+PinQuestion question(PinState state = PinState::Ready) {
+    return {"PIV Card", "Alice", state, "alice", {}};
+}
 
 // Everything that we say to a program that answers OK to all of it, up to the request for the PIN.
 std::vector<std::string> sayAll(PinentryDialog& dialog) {
@@ -32,7 +39,8 @@ TEST(PinentryDialogTest, SaysItsWishesInOrderAndThenAsksForThePin) {
         ElementsAre("OPTION ttyname=/dev/pts/3\n", "OPTION ttytype=xterm\n",
                     "OPTION lc-ctype=C.UTF-8\n", "SETTIMEOUT 120\n", "SETTITLE Smart card\n",
                     "SETDESC Enter the PIN of the card \"PIV Card\". The card then proves "
-                    "that it holds the identity \"Alice\".\n",
+                    "that it holds the identity \"Alice\", so that it can be paired with the "
+                    "account alice.\n",
                     "SETPROMPT PIN:\n", "GETPIN\n"));
     EXPECT_FALSE(dialog.isOver());
 }
@@ -40,27 +48,78 @@ TEST(PinentryDialogTest, SaysItsWishesInOrderAndThenAsksForThePin) {
 TEST(PinentryDialogTest, NamesNoTerminalOnADesktop) {
     PinentryDialog dialog(question(), std::nullopt);
 
-    EXPECT_THAT(sayAll(dialog), testing::Each(testing::Not(HasSubstr("tty"))));
+    EXPECT_THAT(sayAll(dialog), testing::Each(Not(HasSubstr("tty"))));
 }
 
-TEST(PinentryDialogTest, WarnsBeforeTheLastTry) {
+TEST(PinentryDialogTest, NamesNoAccountWhereItMayBeAny) {
+    auto ofRoot = question();
+    ofRoot.account.clear();
+    PinentryDialog dialog(ofRoot, std::nullopt);
+
+    EXPECT_THAT(sayAll(dialog), Contains(HasSubstr("can be paired with an account.\n")));
+}
+
+TEST(PinentryDialogTest, SaysWhatTheCardTellsOfTheTriesThatAreLeft) {
     PinentryDialog few(question(PinState::FewTriesLeft), std::nullopt);
     PinentryDialog last(question(PinState::LastTry), std::nullopt);
 
-    EXPECT_THAT(sayAll(few), testing::Contains(HasSubstr("%0A%0AA wrong PIN was entered before")));
-    EXPECT_THAT(sayAll(last), testing::Contains(HasSubstr("%0A%0AThis is the last try")));
+    EXPECT_THAT(sayAll(few), Contains(HasSubstr("%0A%0AA wrong PIN was entered before")));
+    EXPECT_THAT(sayAll(last), Contains(HasSubstr("%0A%0AThis is the last try")));
+}
+
+TEST(PinentryDialogTest, AsksForTheLastTryOnlyOfWhoWantsIt) {
+    for (const auto state : {PinState::Ready, PinState::FewTriesLeft}) {
+        PinentryDialog dialog(question(state), std::nullopt);
+        EXPECT_THAT(sayAll(dialog), Not(Contains("CONFIRM\n")));
+    }
+    PinentryDialog last(question(PinState::LastTry), std::nullopt);
+
+    const auto said = sayAll(last);
+
+    const auto confirm = std::ranges::find(said, "CONFIRM\n");
+    ASSERT_NE(confirm, said.end());
+    EXPECT_THAT(*std::prev(confirm), HasSubstr("only one try is left"));
+    EXPECT_THAT(*std::next(confirm), HasSubstr("SETDESC Enter the PIN"));
+    EXPECT_EQ(said.back(), "GETPIN\n");
+}
+
+struct Declined {
+    const char* line;
+    Outcome outcome;
+};
+
+TEST(PinentryDialogTest, AsksForNoPinWithoutAYesToTheLastTry) {
+    constexpr Declined kDeclined[] = {
+        {"ERR 83886179 Operation cancelled <Pinentry>", Outcome::Cancelled},
+        {"ERR 83886194 Not confirmed <Pinentry>", Outcome::Cancelled},
+        {"ERR 83886142 Timeout <Pinentry>", Outcome::TimedOut},
+        {"ERR 536871187 Unknown IPC command <User defined source 1>", Outcome::Unavailable},
+    };
+    for (const auto& [line, outcome] : kDeclined) {
+        SCOPED_TRACE(line);
+        PinentryDialog dialog(question(PinState::LastTry), std::nullopt);
+        auto said = dialog.take("OK");
+        while (said != "CONFIRM\n") said = dialog.take("OK");
+
+        EXPECT_EQ(dialog.take(line), "");
+
+        EXPECT_TRUE(dialog.isOver());
+        EXPECT_EQ(dialog.takeAnswer().outcome, outcome);
+    }
 }
 
 TEST(PinentryDialogTest, LetsNoNameSpeakForIt) {
     PinQuestion hostile = question();
     hostile.card = "A\nGETPIN 100%25\r";
     hostile.identity = std::string(5000, 'x');
+    hostile.account = std::string(5000, 'y');
+    hostile.state = PinState::LastTry;
     PinentryDialog dialog(hostile, PinentryTerminal{"/dev/pts/3\nBYE", "xterm"});
 
     for (const auto& line : sayAll(dialog)) {
         EXPECT_LE(line.size(), 1000u);
         EXPECT_EQ(line.find('\n'), line.size() - 1) << line;
-        EXPECT_THAT(line, testing::Not(HasSubstr("100%25\"")));
+        EXPECT_THAT(line, Not(HasSubstr("100%25\"")));
     }
 }
 

@@ -26,7 +26,7 @@ TEST_F(ProofsTest, HoldForTheUserAndTheKeyThatWereProved) {
 TEST_F(ProofsTest, AreUsedUpOnce) {
     _proofs.remember(1000, hashOf(1));
 
-    _proofs.useUp(1000, hashOf(1));
+    _proofs.hold(1000, hashOf(1))->useUp();
 
     EXPECT_FALSE(_proofs.hold(1000, hashOf(1)));
 }
@@ -58,10 +58,43 @@ TEST_F(ProofsTest, TellHowLongTheLastOfThemStillHolds) {
     _now += 20'000;
     EXPECT_EQ(_proofs.timeLeft(), 40s);
 
-    _proofs.useUp(1000, hashOf(2));
+    _proofs.hold(1000, hashOf(2))->useUp();
     EXPECT_EQ(_proofs.timeLeft(), 30s);
     _now += 60'000;
     EXPECT_EQ(_proofs.timeLeft(), 0ms);
+}
+
+TEST_F(ProofsTest, ServeOneAtATime) {
+    _proofs.remember(1000, hashOf(1));
+
+    const auto held = _proofs.hold(1000, hashOf(1));
+
+    ASSERT_TRUE(held);
+    EXPECT_FALSE(_proofs.hold(1000, hashOf(1)));
+}
+
+TEST_F(ProofsTest, CountAgainForTheRestOfTheirMinuteWhenNothingBecameOfThem) {
+    _proofs.remember(1000, hashOf(1));
+    auto held = _proofs.hold(1000, hashOf(1));
+    _now += 59'999;
+
+    held.reset();
+
+    EXPECT_TRUE(_proofs.hold(1000, hashOf(1)));
+    _now += 1;
+    EXPECT_FALSE(_proofs.hold(1000, hashOf(1)));
+}
+
+TEST_F(ProofsTest, GivenBackShortenNoneThatCameMeanwhile) {
+    _proofs.remember(1000, hashOf(1));
+    auto held = _proofs.hold(1000, hashOf(1));
+    _now += 30'000;
+    _proofs.remember(1000, hashOf(1));
+
+    held.reset();
+    _now += 45'000;
+
+    EXPECT_TRUE(_proofs.hold(1000, hashOf(1)));
 }
 
 }  // namespace
