@@ -3,9 +3,8 @@
 // Shapes:    one item of the pop-up for each public-key hash that can be paired, in one group for
 //            each token. Choosing an item only selects it. Each button ends the operation.
 // Ownership: holds its operation; the outlets belong to the window.
-// Threads:   the main queue's only; it may be made on any thread. Pairing is done in the
-// background,
-//            which keeps the dialog until it is done.
+// Threads:   the main queue's only; it may be made on any thread. Pairing is background work, which
+//            keeps the dialog until it is done.
 // Blocking:  the first use loads the window; Do not show again waits for the disk.
 // Errors:    a part that the window lacks is passed over.
 // In tests:  tests/unit/ui/bind_dialog_*_test.cpp

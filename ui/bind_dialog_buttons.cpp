@@ -45,7 +45,7 @@ void BindDialog::finish(const BindOperation::OptionalHash& hash, const PairingOu
     if (!outcome.lacksUnlockKey)
         return _operation->finishWithResult(outcome.result, hash, outcome.error);
     auto& texts = current().localization();
-    // The sheet must not keep the dialog: it goes with it, and one that nobody dismisses would keep
+    // The sheet goes with the dialog and must not keep it: one that nobody dismisses would keep
     // both.
     showAlert({platform::AlertStyle::Critical, texts.text("STORE_UNLOCK_KEY_FAILED"),
                texts.text("STORE_UNLOCK_KEY_FAILED_INFO"), texts.text("OK")},

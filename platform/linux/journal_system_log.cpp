@@ -73,6 +73,7 @@ void writeToJournal(const LogRecord& record) {
     };
     if (!record.activity.empty()) fields.push_back("ACTIVITY=" + std::string(record.activity));
     std::vector<iovec> parts;
+    parts.reserve(fields.size());
     for (auto& field : fields) parts.push_back({field.data(), field.size()});
     sd_journal_sendv(parts.data(), static_cast<int>(parts.size()));
 }

@@ -1,7 +1,9 @@
 // Pair between its worker and the main queue, as it is in a real process.
 
 #include <atomic>
+#include <functional>
 #include <thread>
+#include <utility>
 
 #include "bind_dialog_fixture.h"
 
@@ -17,7 +19,7 @@ protected:
     }
 
     // What was clicked is done on a thread of its own, while this one does the main queue's work
-    // and what else a test wants.
+    // and, at least once, what else a test wants.
     template <typename Meanwhile>
     void besideTheWorker(Meanwhile meanwhile) {
         std::atomic<bool> working = true;
@@ -25,10 +27,10 @@ protected:
             workQueues().runBackground();
             working = false;
         });
-        while (working) {
+        do {
             meanwhile();
             workQueues().runMain();
-        }
+        } while (working);
         worker.join();
         workQueues().runMain();
     }
@@ -68,6 +70,41 @@ TEST_F(BindDialogThreads, TheDialogIsClosedAndLetGoWhileTheWorkerPairs) {
 
     EXPECT_EQ(replies, std::vector{BindResult::Succeeded});
     EXPECT_TRUE(gone.expired());
+}
+
+// A main queue that is always faster than whoever hands work in.
+class EagerMainQueue final : public platform::WorkQueues {
+public:
+    explicit EagerMainQueue(platform::WorkQueues& others) : _others(others) {}
+
+    std::function<void()> done;  // called after each work on the main queue
+
+    void runOnMain(Work work) override {
+        work();
+        work = nullptr;
+        done();
+    }
+    void runOnMainAfter(std::chrono::milliseconds delay, Work work) override {
+        _others.runOnMainAfter(delay, std::move(work));
+    }
+    void runInBackground(Work work) override { _others.runInBackground(std::move(work)); }
+
+private:
+    platform::WorkQueues& _others;
+};
+
+TEST_F(BindDialogThreads, TheWorkerKeepsNothingOfTheDialogThatItGaveToTheMainQueue) {
+    const std::weak_ptr<BindDialog> held = dialog;
+    bool isGone = false;
+    EagerMainQueue eager(workQueues());
+    eager.done = [&] { isGone = held.expired(); };
+    fakePlatform().workQueues = &eager;
+    screen().click("okButton");
+    dialog.reset();
+
+    workQueues().runBackground();
+
+    EXPECT_TRUE(isGone);
 }
 
 TEST_F(BindDialogThreads, TheDialogGoesOnTheMainQueueThoughTheWorkerHeldItLast) {
