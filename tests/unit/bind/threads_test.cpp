@@ -74,6 +74,30 @@ TEST_F(Threads, TheCheckComesWhileTheFirstTokenDoes) {
     }
 }
 
+TEST_F(Threads, TheDialogHasNoWindowWhileMoreTokensCome) {
+    for (int round = 0; round < 50; ++round) {
+        operation = BindOperation::initWithUserName("alice", [this](const auto& forOperation) {
+            auto made = std::make_shared<SilentDialog>(forOperation, events);
+            made->hasWindow = false;
+            dialog = made;
+            return made;
+        });
+        insertBlue();
+        start();
+        const auto watcher = tokens.watcher.lock();
+
+        besideTheMainQueue([&] {
+            watcher->insert(blue);
+            watcher->insert(red);
+        });
+
+        EXPECT_EQ(events.take(), (Happened{"show", "close", "report 3"}));
+        EXPECT_EQ(operation->tokenWatcher(), nullptr);
+        EXPECT_TRUE(dialog.expired());
+        service.remove(blue);
+    }
+}
+
 TEST_F(Threads, TheDialogFinishesWhileItsTokenLeaves) {
     for (int round = 0; round < 50; ++round) {
         operation = makeOperation("alice");
