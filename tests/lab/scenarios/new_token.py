@@ -103,7 +103,6 @@ def pcscd_may_come_late(lab):
     _receive(lab)
     lab.root("systemctl", "stop", "pcscd.socket", "pcscd.service")
     leave_soon(lab)
-    lab.root("systemctl", "restart", SERVICE)
     # After the last of the tries that it makes for a while.
     time.sleep(TRYING_SECONDS)
 
@@ -117,7 +116,6 @@ def pcscd_may_come_late(lab):
 
 def nothing_wakes_anybody_while_no_card_is_in(lab):
     leave_soon(lab)
-    lab.root("systemctl", "restart", SERVICE)
 
     _expect_quiet(lab)
 
@@ -125,7 +123,6 @@ def nothing_wakes_anybody_while_no_card_is_in(lab):
 def nothing_wakes_anybody_while_a_card_is_in(lab):
     _receive(lab)
     leave_soon(lab)
-    lab.root("systemctl", "restart", SERVICE)
     lab.insert("rsa")
     _wait_for(lab, 1)
 
