@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "platform/linux/send_notification.h"
+#include "platform/linux/session_bus_notifications.h"
 #include "platform/token_framework.h"
 #include "services/hints/hints_log.h"
 
@@ -20,12 +21,24 @@ auto callingAfter(sd_event* event) {
     };
 }
 
-void postNewToken(sd_bus* bus) {
+void postNewToken(sd_bus* bus, sd_bus_message_handler_t onAnswer) {
     const int result =
-        platform::sendNotification(bus, std::string(platform::kNewTokenNotification));
+        platform::sendNotification(bus, std::string(platform::kNewTokenNotification), onAnswer);
     if (result < 0)
         kLog.error("the notification {} cannot be sent: {}", platform::kNewTokenNotification,
                    std::strerror(-result));
+}
+
+// An agent that is about to end takes no more; the next message starts another one.
+int onAnswer(sd_bus_message* answer, void*, sd_bus_error*) {
+    const sd_bus_error* error = sd_bus_message_get_error(answer);
+    if (!error) return 0;
+    if (sd_bus_error_has_name(error, platform::kLeavingError) != 0)
+        postNewToken(sd_bus_message_get_bus(answer), nullptr);
+    else
+        kLog.error("the notification {} was not delivered: {}", platform::kNewTokenNotification,
+                   error->message ? error->message : error->name);
+    return 0;
 }
 
 }  // namespace
@@ -33,7 +46,7 @@ void postNewToken(sd_bus* bus) {
 SessionTokens::SessionTokens(const Parts& parts)
     : _watches({parts.bus, parts.callers, _lookout}),
       _notice({.isUserAtConsole = isUserAtConsole,
-               .post = [bus = parts.bus] { postNewToken(bus); },
+               .post = [bus = parts.bus] { postNewToken(bus, onAnswer); },
                .callAfter = callingAfter(parts.event)}),
       _lookout({.daemon = parts.daemon,
                 .callAfter = callingAfter(parts.event),

@@ -66,9 +66,13 @@ protected:
                                           platform::kDeliverMethod) == 0)
             return 0;
         EXPECT_STREQ(sd_bus_message_get_path(message), platform::kNotificationsObject);
-        EXPECT_EQ(sd_bus_message_get_expect_reply(message), 0);
         EXPECT_GE(sd_bus_message_read(message, "s", &name), 0);
-        static_cast<SessionTokensTest*>(self)->delivered.emplace_back(name ? name : "");
+        auto& test = *static_cast<SessionTokensTest*>(self);
+        test.delivered.emplace_back(name ? name : "");
+        if (test.isAgentLeaving && test.delivered.size() == 1)
+            sd_bus_reply_method_errorf(message, platform::kLeavingError, "post again");
+        else
+            sd_bus_reply_method_return(message, "");
         return 1;
     }
 
@@ -79,6 +83,7 @@ protected:
     fakes::FakeDaemonLink daemon;
     std::optional<SessionTokens> tokens;
     std::vector<std::string> delivered;
+    bool isAgentLeaving = false;  // when the first notification comes
     int watchesAnswered = 0;
 };
 
@@ -92,6 +97,18 @@ TEST_F(SessionTokensTest, NotifiesTheAgentOnceForEachToken) {
     runUntilQuiet();
 
     EXPECT_THAT(delivered, ElementsAre("org.vlm.token.new-token", "org.vlm.token.new-token"));
+}
+
+TEST_F(SessionTokensTest, NotifiesTheNextAgentWhenOneIsAboutToEnd) {
+    sessions().login(getuid(), /*onConsole=*/true);
+    isAgentLeaving = true;
+    beginSession();
+
+    answerLook({"a"});
+    runUntil([&] { return delivered.size() >= 2; });
+    runUntilQuiet();
+
+    EXPECT_EQ(delivered.size(), 2U);
 }
 
 TEST_F(SessionTokensTest, NotifiesNobodyWhileTheUserIsNotAtTheConsole) {

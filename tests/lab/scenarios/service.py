@@ -20,6 +20,8 @@ def nothing_starts_it_but_a_request(lab):
 
 def it_leaves_when_idle_and_comes_back_with_its_pairings(lab):
     leave_soon(lab)
+    # A window would watch the card, and keep the daemon.
+    lab.user("alice", "vlmbind", "-s", "disable")
     hash_ = present(lab, "rsa", "Alice Archer")
     check.assertEqual(pair(lab, "alice", hash_).status, 0)
 
