@@ -1,5 +1,5 @@
-// Application: this process as an agent of the desktop, started when a notification is posted for it
-// and run by the desktop's loop until its work is done.
+// Application: this process as an agent of the desktop, started when a notification is posted for
+// it and run by the desktop's loop until its work is done.
 //
 // Ownership: a transaction is closed by letting go of it.
 // Threads:   the handler is set and run() is called on the main queue's thread; the rest on any.

@@ -20,10 +20,14 @@ namespace {
 void logEnd(BindResult result, const std::optional<platform::Error>& error) {
     const auto& log = BindUtils::log();
     switch (result) {
-        case BindResult::Succeeded: return log.debug("vlm bind succeeded");
-        case BindResult::Failed: return log.debug("vlm bind failed: {}", error);
-        case BindResult::Canceled: return log.debug("vlm bind canceled");
-        case BindResult::NotOffered: return log.debug("vlm bind interrupted");
+        case BindResult::Succeeded:
+            return log.debug("vlm bind succeeded");
+        case BindResult::Failed:
+            return log.debug("vlm bind failed: {}", error);
+        case BindResult::Canceled:
+            return log.debug("vlm bind canceled");
+        case BindResult::NotOffered:
+            return log.debug("vlm bind interrupted");
     }
     log.debug("vlm bind finished with unknown result: {}", static_cast<std::int32_t>(result));
 }

@@ -1,5 +1,5 @@
-// Agent: the program as the desktop starts it, without arguments. It offers to pair a card, once, and
-// ends.
+// Agent: the program as the desktop starts it, without arguments. It offers to pair a card, once,
+// and ends.
 //
 // Ownership: the application keeps its handler, and through it the agent, as long as the process.
 // Threads:   events come on the main queue; a bind ends on any thread.

@@ -1,4 +1,5 @@
-// Control of the pairing dialog: asking for it, and the user's preference whether to be asked at all.
+// Control of the pairing dialog: asking for it, and the user's preference whether to be asked at
+// all.
 
 #pragma once
 

@@ -46,10 +46,9 @@ bool DesktopApplication::takeSignals() {
     sigaddset(&terminate, SIGTERM);
     pthread_sigmask(SIG_BLOCK, &terminate, nullptr);
     sd_event_source* source = nullptr;
-    const int result =
-        _loop.event() ? sd_event_add_signal(_loop.event(), &source, SIGTERM,
-                                            &DesktopApplication::onTerminate, this)
-                      : -1;
+    const int result = _loop.event() ? sd_event_add_signal(_loop.event(), &source, SIGTERM,
+                                                           &DesktopApplication::onTerminate, this)
+                                     : -1;
     _onTerminate.reset(source);
     return result >= 0;
 }

@@ -1,5 +1,5 @@
-// LaunchEvents: the notifications that the session bus delivers to this program, which it starts for
-// them. They are calls of Deliver(s name), see session_bus_notifications.h.
+// LaunchEvents: the notifications that the session bus delivers to this program, which it starts
+// for them. They are calls of Deliver(s name), see session_bus_notifications.h.
 //
 // Ownership: the connection is on the loop until this goes.
 // Threads:   the loop's only; refusing is for any.

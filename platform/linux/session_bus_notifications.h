@@ -14,8 +14,8 @@ inline constexpr const char* kNotificationsObject = "/org/vlm/vlmbind";
 inline constexpr const char* kNotificationsInterface = "org.vlm.Notifications";
 inline constexpr const char* kDeliverMethod = "Deliver";
 
-// The answer of a receiver that is about to end, to who waits for one: the next call reaches another
-// process.
+// The answer of a receiver that is about to end, to who waits for one: the next call reaches
+// another process.
 inline constexpr const char* kLeavingError = "org.vlm.Notifications.Error.Leaving";
 
 class SessionBusNotifications final : public Notifications {

@@ -17,8 +17,8 @@ std::string field(const CK_UTF8CHAR (&padded)[size]) {
     return {reinterpret_cast<const char*>(padded), size};
 }
 
-// One thread calls, and says so: without locks a module cannot lock itself out, as one does when its
-// card is pulled while it is read.
+// One thread calls, and says so: without locks a module cannot lock itself out, as one does when
+// its card is pulled while it is read.
 CK_RV initialize(CK_FUNCTION_LIST* module) { return module->C_Initialize(nullptr); }
 
 }  // namespace
