@@ -4,6 +4,8 @@
 //
 //   window_bench FOLDER-OF-VLMBIND BARE-DIALOG
 
+#include <poll.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <array>
@@ -20,6 +22,7 @@
 #include "bench/temporary_folder.h"
 #include "bench/watched_screen.h"
 #include "fake_hints_service.h"
+#include "platform/linux/file_descriptor.h"
 #include "platform/linux/send_notification.h"
 #include "platform/linux/session_bus_notifications.h"
 #include "platform/token_framework.h"
@@ -34,7 +37,7 @@ using Clock = std::chrono::steady_clock;
 using Seconds = std::chrono::duration<double>;
 using test::eventually;
 
-constexpr int kTurns = 5;
+constexpr int kTurns = 40;
 constexpr double kGoal = 1.5;
 constexpr useconds_t kBetweenLooks = 200;  // microseconds
 constexpr const char* kToken = "pkcs11:token=blue";
@@ -70,6 +73,8 @@ private:
     Clock::time_point awaitPaint();
     void takeParts(Clock::time_point event, Clock::time_point painted);
     void awaitEmptyScreen();
+    platform::FileDescriptor runningAgent();
+    static void awaitEnd(const platform::FileDescriptor& process);
 
     static test::PrivateBus::Options sessionBus(const std::filesystem::path& agent,
                                                 const std::filesystem::path& folder);
@@ -136,11 +141,30 @@ Seconds Desktop::untilOffered() {
     sd_bus_flush(_poster.get());
     const auto painted = awaitPaint();
     takeParts(event, painted);
+    const auto agent = runningAgent();
     _service->pull(kToken);
     awaitEmptyScreen();
-    if (!eventually([this] { return !_bus->hasOwner(platform::kNotificationsService); }))
-        fail("the agent does not end");
+    awaitEnd(agent);
+    _log.take();  // what it says at its end is no part of the next one's way
     return painted - event;
+}
+
+platform::FileDescriptor Desktop::runningAgent() {
+    sd_bus_creds* found = nullptr;
+    pid_t process = 0;
+    if (sd_bus_get_name_creds(_poster.get(), platform::kNotificationsService, SD_BUS_CREDS_PID,
+                              &found) < 0 ||
+        sd_bus_creds_get_pid(found, &process) < 0)
+        fail("the window is not the agent's");
+    sd_bus_creds_unref(found);
+    return platform::FileDescriptor(static_cast<int>(syscall(SYS_pidfd_open, process, 0)));
+}
+
+// To the last of it: what a program does at its end would make the next one wait.
+void Desktop::awaitEnd(const platform::FileDescriptor& process) {
+    pollfd end{process.get(), POLLIN, 0};
+    constexpr std::chrono::milliseconds kPatience = test::Child::kPatience;
+    if (poll(&end, 1, static_cast<int>(kPatience.count())) != 1) fail("the agent does not end");
 }
 
 void Desktop::takeParts(Clock::time_point event, Clock::time_point painted) {
@@ -160,8 +184,10 @@ void Desktop::takeParts(Clock::time_point event, Clock::time_point painted) {
 
 Seconds Desktop::untilShown(const std::string& program) {
     const auto start = Clock::now();
-    const test::Child shown({program});
+    auto shown = std::make_unique<test::Child>(std::vector{program});
     const auto painted = awaitPaint();
+    shown.reset();
+    awaitEmptyScreen();
     return painted - start;
 }
 
