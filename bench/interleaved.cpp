@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <utility>
 
 namespace vlm::bench {
 
@@ -31,12 +32,14 @@ std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t tu
         }
     }
     std::vector<Seconds> medians;
-    for (auto& each : times) {
-        const auto middle = each.begin() + static_cast<std::ptrdiff_t>(each.size() / 2);
-        std::ranges::nth_element(each, middle);
-        medians.push_back(*middle);
-    }
+    for (auto& each : times) medians.push_back(quantile(std::move(each), 0.5));
     return medians;
+}
+
+Seconds quantile(std::vector<Seconds> times, double part) {
+    const auto index = static_cast<std::ptrdiff_t>(static_cast<double>(times.size()) * part);
+    std::ranges::nth_element(times, times.begin() + index);
+    return times.at(static_cast<std::size_t>(index));
 }
 
 std::string shown(Seconds time) {

@@ -27,6 +27,10 @@ std::vector<std::chrono::duration<double>> medianTimes(const std::vector<Work>& 
                                                        std::size_t turns,
                                                        Clock clock = Clock::Processor);
 
+// The time that this part of all runs stayed below; the half of them gives the median.
+std::chrono::duration<double> quantile(std::vector<std::chrono::duration<double>> times,
+                                       double part);
+
 // Keeps the compiler from leaving out work whose result nobody looks at.
 template <typename Value>
 void keep(const Value& value) {

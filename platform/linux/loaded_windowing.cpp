@@ -57,7 +57,9 @@ void LoadedWindowing::activateIgnoringOthers() {
     if (_loaded) _loaded->activateIgnoringOthers();
 }
 
-// The module is never closed: a toolkit cannot be taken out of a process again.
+// The module is never closed: a toolkit cannot be taken out of a process again. Of what a toolkit
+// calls, a window reaches little: to look up all of it at once would be a good part of the time until
+// the window is there.
 void LoadedWindowing::load() {
     std::error_code error;
     const auto file = std::ranges::find_if(
@@ -65,7 +67,7 @@ void LoadedWindowing::load() {
     if (file == _modules.end())
         return kLog.error("the windows' module {} is not installed", std::string(kModule));
 
-    void* module = dlopen(file->c_str(), RTLD_NOW | RTLD_LOCAL);
+    void* module = dlopen(file->c_str(), RTLD_LAZY | RTLD_LOCAL);
     if (module) {
         _runLoop = entry<RunLoopEntry>(module, kRunLoopEntry);
         _endLoop = entry<EndLoopEntry>(module, kEndLoopEntry);

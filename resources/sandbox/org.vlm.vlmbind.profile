@@ -25,6 +25,9 @@ read /lib64
 # up; the machine's id.
 read /etc
 
+# What the machine knows of its fonts: without it, showing a window opens every one of them.
+read /var/cache/fontconfig
+
 # The program's own parts, when it is not installed in /usr. No other folder there: above a program
 # in somebody's home folder lies that home folder.
 read $(INSTALL_DIR)/lib

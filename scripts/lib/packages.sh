@@ -15,6 +15,9 @@ test_packages=(
     black clang clang-format clang-tidy libclang-rt-14-dev pyflakes3 shellcheck
 )
 
+# A screen in memory, and what looks at it.
+bench_packages=(dbus libxcb1-dev xvfb)
+
 # What boots a container with a desktop in it.
 lab_packages=(mmdebstrap systemd-container)
 

@@ -1,5 +1,6 @@
 #include "platform/linux/qt/window_loader.h"
 
+#include <QCoreApplication>
 #include <QFile>
 
 #include "platform/linux/qt/installed_resources.h"
@@ -16,8 +17,11 @@ constexpr Log kLog(kTokenFramework, "windowing");
 
 }  // namespace
 
-// No widgets of other makers, which would be looked for in folders of the environment.
-WindowLoader::WindowLoader() { clearPluginPaths(); }
+HiddenModules::HiddenModules() : _folders(QCoreApplication::libraryPaths()) {
+    QCoreApplication::setLibraryPaths({});
+}
+
+HiddenModules::~HiddenModules() { QCoreApplication::setLibraryPaths(_folders); }
 
 std::unique_ptr<DialogWindow> WindowLoader::load(std::string_view description) {
     const auto complain = [&](const QString& reason) {

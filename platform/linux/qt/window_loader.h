@@ -2,6 +2,7 @@
 
 #pragma once
 
+#include <QStringList>
 #include <QUiLoader>
 #include <memory>
 #include <string_view>
@@ -10,11 +11,22 @@
 
 namespace vlm::platform::qt {
 
-// Makes the widgets of a description, ours where ours are better.
-class WindowLoader final : private QUiLoader {
+// While this is there, the toolkit finds no modules that it does not have yet.
+class HiddenModules {
 public:
-    WindowLoader();
+    HiddenModules();
+    ~HiddenModules();
+    HiddenModules(const HiddenModules&) = delete;
+    HiddenModules& operator=(const HiddenModules&) = delete;
 
+private:
+    const QStringList _folders;
+};
+
+// Makes the widgets of a description, ours where ours are better. There are none of other makers: a
+// loader would load every module of widgets, from folders of the environment too, when it is made.
+class WindowLoader final : private HiddenModules, private QUiLoader {
+public:
     // Null when there is no such description; the log says why.
     std::unique_ptr<DialogWindow> load(std::string_view description);
 

@@ -14,6 +14,8 @@ void check(int result, const char* what) {
     if (result < 0) throw std::system_error(-result, std::generic_category(), what);
 }
 
+}  // namespace
+
 BusService::Handler answering(BusService::Answer answer) {
     return [answer = std::move(answer)](sd_bus_message* call) {
         std::string reason;
@@ -27,8 +29,6 @@ BusService::Handler answering(BusService::Answer answer) {
         return sd_bus_send(nullptr, reply.get(), nullptr);
     };
 }
-
-}  // namespace
 
 platform::SdBus connectTo(const std::string& address) {
     sd_bus* bus = nullptr;

@@ -40,6 +40,9 @@ private:
     std::optional<BusThread> _thread;
 };
 
+// The handler of exchanges that answers each with what this function says.
+BusService::Handler answering(BusService::Answer answer);
+
 // A connection to the bus at an address.
 platform::SdBus connectTo(const std::string& address);
 

@@ -8,8 +8,8 @@
 #include <stdexcept>
 #include <utility>
 
+#include "platform/linux/sd_bus_named_service_ipc.h"
 #include "platform/linux/token_service_link.h"
-#include "tests/integration/linux/bus_service.h"
 #include "tests/integration/linux/child.h"
 
 namespace vlm::test {
@@ -19,6 +19,10 @@ TokenService::TokenService(const std::string& address, std::set<std::string> tok
                SD_BUS_METHOD("Watch", "", "as", &TokenService::onWatch, SD_BUS_VTABLE_UNPRIVILEGED),
                SD_BUS_SIGNAL("Inserted", "s", 0), SD_BUS_SIGNAL("Removed", "s", 0),
                SD_BUS_VTABLE_END},
+      _requests{SD_BUS_VTABLE_START(0),
+                SD_BUS_METHOD(platform::kExchangeMethod, "a{sv}", "a{sv}", &TokenService::onRequest,
+                              SD_BUS_VTABLE_UNPRIVILEGED),
+                SD_BUS_VTABLE_END},
       _bus(connectTo(address)),
       _stop(::eventfd(0, EFD_CLOEXEC)),
       _tokens(std::move(tokens)) {
@@ -36,6 +40,16 @@ TokenService::~TokenService() {
     eventfd_write(_stop, 1);
     _thread.join();
     ::close(_stop);
+}
+
+void TokenService::answerRequests(const BusService::Answer& answer) {
+    const std::lock_guard lock(_mutex);
+    _answerRequest = answering(answer);
+    sd_bus_slot* object = nullptr;
+    if (sd_bus_add_object_vtable(_bus.get(), &object, platform::kExchangeObject,
+                                 platform::kExchangeInterface, _requests, this) < 0)
+        throw std::runtime_error("the bus does not take the requests");
+    _requestsObject.reset(object);
 }
 
 void TokenService::insert(const std::string& token) {
@@ -67,6 +81,11 @@ void TokenService::emit(const char* signal, const std::string& token) {
     sd_bus_emit_signal(_bus.get(), platform::kTokensObject, platform::kTokensInterface, signal, "s",
                        token.c_str());
     sd_bus_flush(_bus.get());
+}
+
+int TokenService::onRequest(sd_bus_message* call, void* self, sd_bus_error*) {
+    const int result = static_cast<TokenService*>(self)->_answerRequest(call);
+    return result < 0 ? result : 1;
 }
 
 int TokenService::onWatch(sd_bus_message* call, void* self, sd_bus_error*) {

@@ -13,6 +13,7 @@
 #include <thread>
 
 #include "platform/linux/sd_bus_handles.h"
+#include "tests/integration/linux/bus_service.h"
 
 namespace vlm::test {
 
@@ -25,6 +26,9 @@ public:
     TokenService(const TokenService&) = delete;
     TokenService& operator=(const TokenService&) = delete;
 
+    // Answers the requests for this service too from now on, on the thread of its own.
+    void answerRequests(const BusService::Answer& answer);
+
     void insert(const std::string& token);
     void pull(const std::string& token);
 
@@ -36,18 +40,22 @@ public:
     void refuseOnce();
 
 private:
+    static int onRequest(sd_bus_message* call, void* self, sd_bus_error* error);
     static int onWatch(sd_bus_message* call, void* self, sd_bus_error* error);
     int answer(sd_bus_message* call);
     void emit(const char* signal, const std::string& token);
     void run();
 
     const sd_bus_vtable _members[5];
+    const sd_bus_vtable _requests[3];
     platform::SdBus _bus;
     platform::SdBusSlot _object;
+    platform::SdBusSlot _requestsObject;
     int _stop = -1;
 
     std::mutex _mutex;  // of all that follows, and of the bus
     std::condition_variable _asked;
+    BusService::Handler _answerRequest;
     std::set<std::string> _tokens;
     int _timesAsked = 0;
     bool _isHeld = false;

@@ -135,6 +135,14 @@ TEST_F(ConfinedFilesTest, SystemFoldersCanBeReadAndNotChanged) {
     EXPECT_EQ(probe({"list", "/"}).result, EACCES);
 }
 
+TEST_F(ConfinedFilesTest, WhatTheMachineKnowsOfItsFontsCanBeReadAndNotChanged) {
+    const std::filesystem::path known = "/var/cache/fontconfig";
+    if (!std::filesystem::exists(known)) GTEST_SKIP() << "this machine has no " << known;
+
+    EXPECT_EQ(probe({"list", known}).result, 0);
+    EXPECT_EQ(probe({"create", known / "vlm-sandbox-test"}).result, EACCES);
+}
+
 TEST_F(ConfinedFilesTest, TheProgramsOwnResourcesCanBeRead) {
     const auto installed = std::filesystem::path(program).parent_path().parent_path();
 

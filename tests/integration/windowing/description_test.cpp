@@ -7,11 +7,16 @@
 #include <QComboBox>
 #include <QKeySequence>
 #include <QLabel>
+#include <QLibraryInfo>
 #include <QPushButton>
 #include <QScreen>
 #include <QTest>
+#include <filesystem>
+#include <fstream>
 #include <set>
+#include <sstream>
 
+#include "tests/integration/linux/temporary_folder.h"
 #include "tests/integration/windowing/screen.h"
 
 namespace vlm::test {
@@ -54,6 +59,27 @@ TEST_F(BindDialogDescription, ShowsNoKeyInPlaceOfAText) {
         for (const char* property : {"text", "accessibleName", "accessibleDescription", "toolTip"})
             EXPECT_FALSE(widget->property(property).toString().contains("BIND_DIALOG"))
                 << text(widget->objectName()) << "'s " << property;
+}
+
+// A module that is there for something else, as it would be found, and loaded, in the environment.
+TEST_F(BindDialogDescription, LoadsNoModulesOfWidgets) {
+    const TemporaryFolder folder;
+    const auto modules = folder.path() / "designer";
+    std::filesystem::create_directory(modules);
+    const std::filesystem::path platforms =
+        QLibraryInfo::path(QLibraryInfo::PluginsPath).toStdString() + "/platforms";
+    std::filesystem::copy(platforms / "libqminimal.so", modules / "widgets.so");
+    const auto before = QCoreApplication::libraryPaths();
+    QCoreApplication::addLibraryPath(QString::fromStdString(folder.path().string()));
+    const auto with = QCoreApplication::libraryPaths();
+
+    ASSERT_TRUE(windowingOnScreen().loadWindow("BindDialog"));
+
+    std::stringstream loaded;
+    loaded << std::ifstream("/proc/self/maps").rdbuf();
+    EXPECT_EQ(loaded.str().find(modules.string()), std::string::npos);
+    EXPECT_EQ(QCoreApplication::libraryPaths(), with);
+    QCoreApplication::setLibraryPaths(before);
 }
 
 TEST_F(BindDialogDescription, ReturnPairs) {
