@@ -109,14 +109,5 @@ TEST_F(AdministratorRightTest, GivenAnewServesAnotherChange) {
     EXPECT_EQ(status(), 0);
 }
 
-TEST_F(AdministratorRightTest, OfAnAuthorityThatWasStartedAnewIsAnother) {
-    ask("pairing a");
-    authority.grantAndKeep("1", ":1.5");
-    ask("pairing b");
-    authority.grantAndKeep("1", ":1.6");
-
-    EXPECT_EQ(status(), 0);
-}
-
 }  // namespace
 }  // namespace vlm::service
