@@ -86,7 +86,7 @@ TEST_F(AdministratorRightTest, ThatIsKeptServesNoOtherChange) {
     ask("pairing b");
     authority.grantAndKeep("1");
 
-    EXPECT_EQ(status(), status::kNotPermitted);
+    ASSERT_EQ(status(), status::kNotPermitted);
     EXPECT_THAT(answers.back()->text, HasSubstr("one other change"));
 }
 
