@@ -20,7 +20,7 @@ std::optional<Refusal> AdministratorRight::judge(const RightVerdict& verdict,
                                                  const std::string& change) {
     switch (verdict.outcome) {
         case RightVerdict::Outcome::Granted:
-            return verdict.kept ? judgeKept(*verdict.kept, change) : std::nullopt;
+            return verdict.kept.empty() ? std::nullopt : judgeKept(verdict.kept, change);
         case RightVerdict::Outcome::Dismissed:
             return Refusal{status::kCancelled,
                            "the question for an administrator's password was dismissed."};
@@ -41,7 +41,7 @@ std::optional<Refusal> AdministratorRight::judge(const RightVerdict& verdict,
                                   platform::harmlessText(verdict.reason, 512))};
 }
 
-std::optional<Refusal> AdministratorRight::judgeKept(const KeptRight& right,
+std::optional<Refusal> AdministratorRight::judgeKept(const std::string& right,
                                                      const std::string& change) {
     const auto [first, isNew] = _changes.try_emplace(right, change);
     if (isNew || first->second == change) return std::nullopt;

@@ -39,10 +39,10 @@ public:
 
 private:
     std::optional<Refusal> judge(const RightVerdict& verdict, const std::string& change);
-    std::optional<Refusal> judgeKept(const KeptRight& right, const std::string& change);
+    std::optional<Refusal> judgeKept(const std::string& right, const std::string& change);
 
     Authority& _authority;
-    std::map<KeptRight, std::string> _changes;  // what each of them was used for
+    std::map<std::string, std::string> _changes;  // what each right that is kept was used for
 };
 
 }  // namespace vlm::service

@@ -16,7 +16,6 @@
 #include <functional>
 #include <map>
 #include <memory>
-#include <optional>
 #include <string>
 
 #include "platform/types.h"
@@ -30,14 +29,6 @@ struct RightQuestion {
     std::map<std::string, std::string> details;  // harmless text
 };
 
-// A right that the authority keeps for the caller's process, and would give again without asking.
-struct KeptRight {
-    std::string keeper;  // the authority that knows it: another one may give the same id again
-    std::string id;
-
-    auto operator<=>(const KeptRight&) const = default;
-};
-
 struct RightVerdict {
     enum class Outcome {
         Granted,
@@ -47,8 +38,10 @@ struct RightVerdict {
         Failed,
     };
     Outcome outcome = Outcome::Failed;
-    std::optional<KeptRight> kept;  // Granted
-    std::string reason;             // Failed: the end of a sentence
+    // Granted: names a right that the authority keeps for the caller's process, and would give
+    // again without asking; unlike any other name. Empty when it keeps none.
+    std::string kept;
+    std::string reason;  // Failed: the end of a sentence
 };
 
 class Authority {

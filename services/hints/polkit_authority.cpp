@@ -54,10 +54,12 @@ RightVerdict verdictOf(sd_bus_message* reply) {
     if (code < 0) return failed("its answer cannot be understood");
 
     using Outcome = RightVerdict::Outcome;
+    // Another polkit gives the same ids again.
     const char* sender = sd_bus_message_get_sender(reply);
-    if (isAuthorized && details.keptId.empty()) return {Outcome::Granted, {}, {}};
-    if (isAuthorized)
-        return {Outcome::Granted, KeptRight{sender ? sender : "", details.keptId}, {}};
+    if (isAuthorized && !details.keptId.empty())
+        return {
+            Outcome::Granted, platform::text("{} {}", sender ? sender : "", details.keptId), {}};
+    if (isAuthorized) return {Outcome::Granted, {}, {}};
     if (details.isDismissed) return {Outcome::Dismissed, {}, {}};
     return {isChallenge ? Outcome::NobodyToAsk : Outcome::Denied, {}, {}};
 }

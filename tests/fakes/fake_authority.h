@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <memory>
-#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -18,9 +17,7 @@ public:
 
     // What the person or the machine does. Each answers the oldest question that is still open.
     void grant() { answer({Outcome::Granted, {}, {}}); }
-    void grantAndKeep(const std::string& id, const std::string& keeper = ":1.5") {
-        answer({Outcome::Granted, service::KeptRight{keeper, id}, {}});
-    }
+    void grantAndKeep(const std::string& kept) { answer({Outcome::Granted, kept, {}}); }
     void refuse(Outcome outcome, const std::string& reason = "") { answer({outcome, {}, reason}); }
 
     // What happened.

@@ -31,7 +31,7 @@ def others_are_served_while_a_person_reads(lab):
 
 def a_person_may_read_for_longer_than_a_proof_holds(lab):
     hash_, asking = _begin_pairing(lab)
-    # The proof's minute is over, and so is the bus library's own patience.
+    # Then the proof's minute is over, and so is the bus library's own patience.
     time.sleep(62)
 
     lab.answer("polkit", ADMINISTRATOR)

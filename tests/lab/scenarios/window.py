@@ -72,6 +72,16 @@ def an_expired_card_is_not_offered(lab):
     _wait_for_end(lab)
 
 
+def a_name_that_would_deceive_is_shown_as_it_is_written(lab):
+    _offer(lab, "hostile")
+
+    (name,) = _offered(lab)
+    check.assertIn("<b>Eve</b> &amp; ", name)
+    check.assertIn("%s {}", name)
+    for mark in "\u202e\u202c\u2066\u2069":
+        check.assertNotIn(mark, name)
+
+
 def without_a_card_there_is_no_window(lab):
     lab.user("alice", "vlmbind", "-f")
 
