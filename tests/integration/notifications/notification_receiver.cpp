@@ -1,9 +1,10 @@
 // Stands in for the agent on the session bus until the bus ends:
 //
-//     notification_receiver FILE [deaf|absent]
+//     notification_receiver FILE [deaf|absent|answering]
 //
 // Writes "ready" and then each name that is delivered to it as a line of the file and on standard
-// output. A deaf one takes its name and nothing after that; an absent one never takes its name.
+// output. A deaf one takes its name and nothing after that; an absent one never takes its name. Who
+// waits for an answer is told of in place of the name, but by an answering one.
 
 #include <unistd.h>
 
@@ -21,6 +22,7 @@ namespace {
 using namespace vlm::platform;
 
 std::ofstream file;
+bool isAnswering = false;
 
 void tell(const char* line) {
     file << line << std::endl;
@@ -31,8 +33,8 @@ int deliver(sd_bus_message* delivery, void*, sd_bus_error*) {
     const char* name = nullptr;
     const int result = sd_bus_message_read(delivery, "s", &name);
     if (result < 0) return result;
-    // Whoever asks for an answer would wait for one.
-    tell(sd_bus_message_get_expect_reply(delivery) != 0 ? "a reply is expected" : name);
+    const bool isAwaited = sd_bus_message_get_expect_reply(delivery) != 0;
+    tell(isAwaited && !isAnswering ? "a reply is expected" : name);
     return sd_bus_reply_method_return(delivery, "");
 }
 
@@ -48,6 +50,7 @@ int main(int argc, char* argv[]) {
     if (argc < 2) return EXIT_FAILURE;
     file.open(argv[1], std::ios::app);
     const std::string_view manner = argc > 2 ? argv[2] : "";
+    isAnswering = manner == "answering";
 
     sd_bus* opened = nullptr;
     if (sd_bus_open_user(&opened) < 0) return EXIT_FAILURE;

@@ -1,16 +1,12 @@
 """The desktop's agent is told of each card that is inserted, once, and nothing else wakes anybody."""
 
-import time
-
 from machine.checks import check
-from machine.hints_daemon import SERVICE, leave_soon, runs
+from machine.hints_daemon import SERVICE, leave_soon
 from machine.listing import identities, only_identity
+from machine.quiet import expect_quiet
 
 DELIVERED = "/run/vlm-lab/delivered"
 NOTIFICATION = "org.vlm.token.new-token"
-QUIET_SECONDS = 60
-# More than between two tries, two looks, and whatever else has an end.
-SETTLING_SECONDS = 10
 
 
 def each_card_is_told_once(lab):
@@ -101,7 +97,7 @@ def pcscd_may_come_late(lab):
     lab.root("systemctl", "stop", "pcscd.socket", "pcscd.service")
     leave_soon(lab)
 
-    _expect_quiet(lab)
+    expect_quiet(lab, "vlmhintsd")
     lab.root("systemctl", "start", "pcscd.socket")
     lab.root("systemctl", "restart", "virtual-readers")
     lab.insert("rsa")
@@ -112,7 +108,7 @@ def pcscd_may_come_late(lab):
 def nothing_wakes_anybody_while_no_card_is_in(lab):
     leave_soon(lab)
 
-    _expect_quiet(lab)
+    expect_quiet(lab, "vlmhintsd")
 
 
 def nothing_wakes_anybody_while_a_card_is_in(lab):
@@ -121,14 +117,14 @@ def nothing_wakes_anybody_while_a_card_is_in(lab):
     lab.insert("rsa")
     _wait_for(lab, 1)
 
-    _expect_quiet(lab)
+    expect_quiet(lab, "vlmhintsd")
 
 
 def _receive(lab, user: str = "alice") -> None:
     """Puts a receiver that writes down what it gets into the agent's place."""
     lines = (
         r"[Service]\nExecStart=\n"
-        rf"ExecStart=/usr/libexec/vlm-lab/notification_receiver {DELIVERED}-%%u\n"
+        rf"ExecStart=/usr/libexec/vlm-lab/notification_receiver {DELIVERED}-%%u answering\n"
     )
     folder = "/run/systemd/user/vlmbind.service.d"
     lab.root("sh", "-c", f"mkdir -p {folder} && printf '{lines}' >{folder}/receiver.conf")
@@ -151,30 +147,3 @@ def _come_back(lab, user: str) -> None:
     sessions = lab.root("loginctl", "--no-legend").output.splitlines()
     (session,) = [line.split()[0] for line in sessions if line.split()[2:4] == [user, "seat0"]]
     lab.root("loginctl", "activate", session)
-
-
-def _instance(lab) -> str:
-    # Not by a command of the user's: each begins a session, which the instance is told of.
-    return lab.root("pgrep", "--uid", "alice", "--exact", "vlmhintsd").output.strip()
-
-
-def _expect_quiet(lab) -> None:
-    """No thread of the user's instance runs, and the daemon has left and stays away."""
-    pid = _instance(lab)
-    lab.wait_until(
-        "what had to be done is done",
-        lambda: not runs(lab) and len(_switches(lab, pid, SETTLING_SECONDS)) == 1,
-        90,
-    )
-
-    quiet = _switches(lab, pid, QUIET_SECONDS)
-    check.assertEqual(len(quiet), 1, quiet)
-    check.assertFalse(runs(lab))
-
-
-def _switches(lab, pid: str, seconds: float) -> set[str]:
-    """How often each thread has gone to sleep, before and after that time."""
-    count = ["sh", "-c", f"grep ^voluntary_ctxt /proc/{pid}/task/*/status"]
-    before = lab.root(*count).output
-    time.sleep(seconds)
-    return {before, lab.root(*count).output}

@@ -1,7 +1,11 @@
 """The pairing window: who gets it, what it offers while cards come and go, and how it is used."""
 
+import time
+
 from machine.checks import check
+from machine.hints_daemon import leave_soon
 from machine.listing import only_identity, pair, present
+from machine.quiet import expect_quiet
 
 TITLE = "dialog: SmartCard Pairing"
 ALICE, CAROL = "Alice Archer", "Carol Cooper"
@@ -171,6 +175,16 @@ def it_is_above_the_others_in_the_middle_and_has_the_focus(lab):
     check.assertAlmostEqual(int(place["Y"]) + int(place["HEIGHT"]) / 2, 800 / 2, delta=40)
     stays = lab.user("alice", "sh", "-c", "xprop -id $(xdotool getactivewindow) _NET_WM_STATE")
     check.assertIn("_NET_WM_STATE_ABOVE", stays.output)
+
+
+def nothing_wakes_anybody_while_it_waits_for_a_person(lab):
+    # Software cards announce nothing, and are looked for while somebody watches.
+    lab.root("rm", "/usr/share/p11-kit/modules/softhsm2.module")
+    leave_soon(lab)
+    _offer(lab, "rsa")
+    time.sleep(30)  # Then it looks once whether it has shown its window.
+
+    expect_quiet(lab, "vlmhintsd", "vlmbind")
 
 
 def every_part_has_a_role_and_a_name(lab):
