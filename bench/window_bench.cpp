@@ -5,7 +5,9 @@
 //   window_bench FOLDER-OF-VLMBIND BARE-DIALOG
 
 #include <poll.h>
+#include <sys/prctl.h>
 #include <sys/syscall.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
@@ -165,6 +167,8 @@ void Desktop::awaitEnd(const platform::FileDescriptor& process) {
     pollfd end{process.get(), POLLIN, 0};
     constexpr std::chrono::milliseconds kPatience = test::Child::kPatience;
     if (poll(&end, 1, static_cast<int>(kPatience.count())) != 1) fail("the agent does not end");
+    siginfo_t ended{};
+    waitid(P_PIDFD, static_cast<id_t>(process.get()), &ended, WEXITED);
 }
 
 void Desktop::takeParts(Clock::time_point event, Clock::time_point painted) {
@@ -210,6 +214,7 @@ bool measure(const std::filesystem::path& agent, const std::string& bareDialog) 
     const TemporaryFolder run, home;
     sitAtConsole(run.path(), home.path());
     setEnvironment(home.path());
+    prctl(PR_SET_CHILD_SUBREAPER, 1);  // the bus lets go of a program once it is started
     Desktop desktop(agent, home.path());
 
     // The first ones find nothing in the kernel's caches.

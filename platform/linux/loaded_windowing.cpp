@@ -58,8 +58,8 @@ void LoadedWindowing::activateIgnoringOthers() {
 }
 
 // The module is never closed: a toolkit cannot be taken out of a process again. Of what a toolkit
-// calls, a window reaches little: to look up all of it at once would be a good part of the time until
-// the window is there.
+// calls, a window reaches little: to look up all of it at once would be a good part of the time
+// until the window is there.
 void LoadedWindowing::load() {
     std::error_code error;
     const auto file = std::ranges::find_if(
