@@ -13,7 +13,7 @@ from machine.pairing_person import (
     dismiss_alert,
     finish_pairing,
 )
-from machine.pairing_window import TITLE, check_said, offered, wait_for_alert, wait_for_end
+from machine.pairing_window import TITLE, check_said, offer, offered, wait_for_alert, wait_for_end
 
 
 def a_card_pulled_while_the_administrator_is_asked_ends_it(lab):
@@ -94,6 +94,29 @@ def a_daemon_killed_while_the_pin_is_asked_takes_the_question_along(lab):
     dismiss_alert(lab)
     lab.remove()
     _check_the_window_is_gone(lab)
+
+
+def a_log_out_does_not_wait_for_the_window(lab):
+    offer(lab, "rsa")
+
+    _log_out(lab)
+
+
+def a_log_out_does_not_wait_for_a_pin(lab):
+    _ask_for_pin(lab)
+
+    _log_out(lab)
+
+    check_nothing_is_paired(lab)
+
+
+def _log_out(lab) -> None:
+    """As a desktop does it that keeps its screen until its programs have ended."""
+    stop = ["systemctl", "--user", "stop", "graphical-session.target"]
+    ended = lab.user("alice", "timeout", "20", *stop)
+    check.assertEqual(ended.status, 0, ended)
+    _wait_until_holder_is_left_alone(lab)
+    check.assertNotEqual(lab.root("pgrep", "--exact", "vlmbind").status, 0)
 
 
 def _ask_administrator(lab) -> None:
