@@ -45,8 +45,3 @@ def pairings(lab) -> list[tuple[str, str]]:
     """Accounts and the hashes that they are paired with."""
     lines = [line.split() for line in lab.root("vlmctl", "pairings").output.splitlines()]
     return sorted((words[0], word) for words in lines for word in words if len(word) == 64)
-
-
-def active_session(lab) -> str:
-    show = ["loginctl", "show-seat", "seat0", "--property=ActiveSession", "--value"]
-    return lab.root(*show).output.strip()

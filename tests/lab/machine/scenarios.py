@@ -44,7 +44,9 @@ def _scenarios_of(file: Path) -> dict:
     return {
         f"{file.stem}.{name}": function
         for name, function in inspect.getmembers(module, inspect.isfunction)
-        if not name.startswith("_") and list(inspect.signature(function).parameters) == ["lab"]
+        if not name.startswith("_")
+        and function.__module__ == module.__name__  # and not a helper that is imported
+        and list(inspect.signature(function).parameters) == ["lab"]
     }
 
 

@@ -4,6 +4,7 @@ from machine.checks import check
 from machine.hints_daemon import SERVICE, leave_soon
 from machine.listing import identities, only_identity
 from machine.quiet import expect_quiet
+from machine.sessions import come_back
 
 DELIVERED = "/run/vlm-lab/delivered"
 NOTIFICATION = "org.vlm.token.new-token"
@@ -84,7 +85,7 @@ def who_is_not_at_the_console_is_told_when_he_is_back(lab):
     check.assertEqual(_told(lab, "alice"), [])
     lab.remove(2)
     lab.wait_until("it is gone", lambda: len(identities(lab)) == 1)
-    _come_back(lab, "alice")
+    come_back(lab, "alice")
 
     _wait_for(lab, 1, "alice")
     lab.insert("ec", 2)
@@ -141,9 +142,3 @@ def _told(lab, user: str = "alice") -> list[str]:
 def _wait_for(lab, times: int, user: str = "alice", seconds: float = 20) -> None:
     expected = [NOTIFICATION] * times
     lab.wait_until(f"{user} is told {times} times", lambda: _told(lab, user) == expected, seconds)
-
-
-def _come_back(lab, user: str) -> None:
-    sessions = lab.root("loginctl", "--no-legend").output.splitlines()
-    (session,) = [line.split()[0] for line in sessions if line.split()[2:4] == [user, "seat0"]]
-    lab.root("loginctl", "activate", session)

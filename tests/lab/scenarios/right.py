@@ -9,7 +9,6 @@ import subprocess
 from machine.by_hand import (
     ADMINISTRATOR,
     ASK,
-    active_session,
     ask,
     ask_to_pair,
     pairing,
@@ -18,6 +17,7 @@ from machine.by_hand import (
 )
 from machine.checks import check
 from machine.listing import identities, pair, present
+from machine.sessions import set_locked
 
 
 def a_user_pairs_himself_when_an_administrator_allows_it(lab):
@@ -100,14 +100,14 @@ def nobody_is_asked_without_a_proof(lab):
 
 def nobody_is_asked_on_a_locked_screen(lab):
     hash_ = _ready(lab)
-    _set_locked(lab, True)
+    set_locked(lab, True)
 
     done = ask_to_pair(lab, hash_)
     check.assertEqual(statuses(done), ["0", "-2016"])
     check.assertIn("the screen is locked", done.output)
     check.assertEqual(lab.asked("polkit"), [])
 
-    _set_locked(lab, False)
+    set_locked(lab, False)
     check.assertEqual(statuses(ask(lab, f"pair alice {hash_}")), ["0"])
 
 
@@ -190,12 +190,3 @@ def _ready(lab, card: str = "rsa", name: str = "Alice Archer") -> str:
     """Inserts a card, with an administrator there who will allow what is asked."""
     lab.answer("polkit", ADMINISTRATOR)
     return present(lab, card, name)
-
-
-def _set_locked(lab, locked: bool) -> None:
-    session = active_session(lab)
-    # A digit at the head of a path's part is written by its code.
-    path = f"/org/freedesktop/login1/session/_3{session[0]}{session[1:]}"
-    member = ["org.freedesktop.login1.Session", "SetLockedHint", "b", str(locked).lower()]
-    done = lab.root("busctl", "call", "org.freedesktop.login1", path, *member)
-    check.assertEqual(done.status, 0, done)
