@@ -33,8 +33,7 @@ public:
 
     std::shared_ptr<PairingDialog> makeDialog(
         const std::shared_ptr<BindOperation>& operation) override {
-        const auto nothing = [](const auto&...) {};
-        auto made = BindDialog::initWithOperation(operation, {nothing, nothing, nothing});
+        auto made = BindDialog::initWithOperation(operation);
         const std::lock_guard lock(_mutex);
         std::erase_if(_made, [](const auto& each) { return each.expired(); });
         _made.push_back(made);

@@ -182,5 +182,7 @@ class LabCards(unittest.TestCase):
                 "two-identities",
                 "slow",
                 "breaking",
+                "long-names",
+                "hostile",
             },
         )
