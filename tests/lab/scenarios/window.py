@@ -6,6 +6,7 @@ from machine.checks import check
 from machine.hints_daemon import leave_soon
 from machine.listing import only_identity, pair, present
 from machine.pairing_window import (
+    ITS_LINES,
     TITLE,
     check_said,
     insert,
@@ -222,7 +223,7 @@ def assistive_programs_give_the_focus_and_press_buttons(lab):
     lab.windows("press", "Cancel")
 
     wait_for_end(lab)
-    check.assertIn("result: 2", lab.journal("_COMM=vlmbind", "ACTIVITY=clicked 'Cancel'"))
+    check.assertIn("result: 2", lab.journal(ITS_LINES, "ACTIVITY=clicked 'Cancel'"))
     check_said(lab, "vlm bind canceled")
 
 
