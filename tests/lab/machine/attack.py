@@ -79,6 +79,7 @@ class Attacker:
             stderr=subprocess.STDOUT,
             text=True,
         )
+        self._rest = ""
         self.first_line = self._process.stdout.readline().strip()
 
     def __enter__(self) -> "Attacker":
@@ -93,5 +94,6 @@ class Attacker:
 
     def end(self) -> str:
         """What else it printed."""
-        output, _ = self._process.communicate(timeout=60)
-        return output
+        if self._process.poll() is None:
+            self._rest, _ = self._process.communicate(timeout=60)
+        return self._rest
