@@ -4,7 +4,6 @@
 #include <utility>
 
 #include "platform/linux/sd_bus_message.h"
-#include "services/hints/bus_caller.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/reply.h"
 #include "services/hints/service_names.h"
@@ -69,7 +68,10 @@ int BusServer::onCall(sd_bus_message* call, void* self, sd_bus_error*) {
 }
 
 void BusServer::receive(sd_bus_message* call) {
-    const auto caller = callerOf(call);
+    // Whoever changes something wants to know whether it was done. Who does not, is not held up by
+    // the bus's bound on answers that are owed, and could keep this program from everybody else.
+    if (sd_bus_message_get_expect_reply(call) <= 0) return;
+    const auto caller = _callers.senderOf(call);
     if (!caller) return;
     if (isFull(caller->user))
         return send(call, refusalReply({status::kBusy,
@@ -98,7 +100,6 @@ bool BusServer::isFull(platform::UserId user) const {
 }
 
 void BusServer::send(sd_bus_message* call, const Message& content) {
-    if (sd_bus_message_get_expect_reply(call) <= 0) return;
     sd_bus_message* made = nullptr;
     if (sd_bus_message_new_method_return(call, &made) < 0) return;
     const platform::SdBusMessage reply(made);

@@ -1,12 +1,13 @@
 // BusServer: one method, `a{sv}` in and `a{sv}` out, of the hints service's object on a bus.
 //
 // Who calls is asked of the bus. Answers may come in any order and at any time; a caller that has
-// left gets none. There is a bound on the requests that wait for their answers, for each user and
-// in all, so that nobody can use up this program's memory or keep others out. A request waits until
-// it is answered, or until the last copy of its reply is gone.
+// left gets none, and a call that wants none is passed over. There is a bound on the requests that
+// wait for their answers, for each user and in all, so that nobody can use up this program's memory
+// or keep others out. A request waits until it is answered, or until the last copy of its reply is
+// gone.
 //
 // Ownership: the bus and the exchanges outlive it. Threads: the event loop's.
-// Blocking:  asks the bus once a request.
+// Blocking:  asks the bus once about each caller.
 // Errors:    a message that is no such dictionary is refused like any other bad request.
 // In tests:  tests/integration/service/bus_server_test.cpp
 
@@ -20,6 +21,7 @@
 #include <memory>
 
 #include "platform/linux/sd_bus_handles.h"
+#include "services/hints/bus_caller.h"
 #include "services/hints/exchanges.h"
 
 namespace vlm::service {
@@ -53,6 +55,7 @@ private:
     Exchanges& _exchanges;
     std::array<sd_bus_vtable, 3> _members;
     platform::SdBusSlot _slot;
+    KnownCallers _callers;
 
     // Shared with the requests that wait; answers that come after the server find it gone.
     std::shared_ptr<Counts> _counts = std::make_shared<Counts>();

@@ -4,7 +4,6 @@
 
 #include <utility>
 
-#include "services/hints/bus_caller.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/permission.h"
 #include "services/hints/service_names.h"
@@ -47,7 +46,7 @@ int BusTokenWatches::onWatch(sd_bus_message* call, void* self, sd_bus_error*) {
 }
 
 int BusTokenWatches::watch(sd_bus_message* call) {
-    const auto caller = callerOf(call);
+    const auto caller = _callers.senderOf(call);
     if (!caller) return 1;
     if (const auto refusal = refusalFor(*caller, tokensOfThisUser())) {
         kLog.notice("refused for user {}: {} ({})", caller->user, refusal->text, refusal->status);

@@ -22,6 +22,7 @@
 #include <vector>
 
 #include "platform/linux/sd_bus_handles.h"
+#include "services/hints/bus_caller.h"
 #include "services/hints/caller.h"
 #include "services/hints/token_lookout.h"
 
@@ -63,6 +64,7 @@ private:
     std::vector<platform::SdBusMessage> _waiting;                          // for the first look
     bool _isKnown = false;  // what the first look has shown
     platform::SdBusSlot _slot;
+    KnownCallers _callers;
 };
 
 }  // namespace vlm::service

@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "services/hints/closed_process.h"
 #include "services/hints/instances.h"
 #include "services/hints/options.h"
 #include "services/hints/service_loop.h"
@@ -17,6 +18,7 @@ int main(int argc, char* argv[]) {
         return parsed.exitStatus;
     }
 
+    closeToOthers();
     ServiceLoop loop;
     if (!loop.get()) {
         std::cerr << "vlmhintsd: the system has no room for an event loop\n";

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <utility>
 
-#include "services/hints/bus_caller.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/service_names.h"
 
@@ -42,14 +41,16 @@ PrompterRegistry::Waiting PrompterRegistry::callWhenRegistered(platform::UserId 
 }
 
 int PrompterRegistry::onRegister(sd_bus_message* call, void* self, sd_bus_error*) {
-    const auto caller = callerOf(call);
+    auto& registry = *static_cast<PrompterRegistry*>(self);
+    const auto caller = registry._callers.senderOf(call);
     if (!caller) return 1;
-    static_cast<PrompterRegistry*>(self)->add(caller->user, caller->connection);
+    if (registry.prompterOf(caller->user) != caller->connection)
+        registry.add(caller->user, caller->connection);
     return sd_bus_reply_method_return(call, nullptr);
 }
 
 void PrompterRegistry::add(platform::UserId user, const std::string& connection) {
-    auto watch = _callers.watch(connection, [this, user, connection] {
+    auto watch = _watch.watch(connection, [this, user, connection] {
         const auto found = _prompters.find(user);
         if (found != _prompters.end() && found->second.connection == connection)
             _prompters.erase(found);

@@ -25,6 +25,7 @@
 #include <utility>
 
 #include "platform/linux/sd_bus_handles.h"
+#include "services/hints/bus_caller.h"
 #include "services/hints/caller.h"
 
 namespace vlm::service {
@@ -37,8 +38,8 @@ public:
 
     using Waiting = std::shared_ptr<const std::function<void()>>;
 
-    PrompterRegistry(sd_bus* bus, CallerWatch& callers, Clock clock)
-        : _bus(bus), _callers(callers), _clock(std::move(clock)) {}
+    PrompterRegistry(sd_bus* bus, CallerWatch& watch, Clock clock)
+        : _bus(bus), _watch(watch), _clock(std::move(clock)) {}
     PrompterRegistry(const PrompterRegistry&) = delete;
     PrompterRegistry& operator=(const PrompterRegistry&) = delete;
 
@@ -68,10 +69,11 @@ private:
     static const sd_bus_vtable kMembers[];
 
     sd_bus* _bus;
-    CallerWatch& _callers;
+    CallerWatch& _watch;
     const Clock _clock;
     std::int64_t _registrationEnds = 0;
     platform::SdBusSlot _slot;
+    KnownCallers _callers;
     std::map<platform::UserId, Prompter> _prompters;
     std::multimap<platform::UserId, std::weak_ptr<const std::function<void()>>> _waiting;
 };

@@ -3,7 +3,6 @@
 //
 //   vlm-token-worker LOOK-AGAIN-MILLISECONDS MODULE-PATH
 
-#include <sys/prctl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -12,6 +11,7 @@
 #include <iostream>
 #include <string>
 
+#include "services/hints/closed_process.h"
 #include "services/hints/tokens/card_module.h"
 #include "services/hints/tokens/frames.h"
 #include "services/hints/tokens/worker_protocol.h"
@@ -21,9 +21,6 @@ namespace {
 
 constexpr int kSocket = 3;
 constexpr unsigned kSecondsToLeave = 5;
-
-// A PIN passes through this process: its memory may neither be kept nor be looked at.
-void closeToOthers() { prctl(PR_SET_DUMPABLE, 0); }
 
 class Worker {
 public:

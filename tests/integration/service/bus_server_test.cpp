@@ -101,6 +101,33 @@ TEST_F(BusServerTest, ToleratesAnAnswerAfterItsOwnEnd) {
     EXPECT_TRUE(replies.empty());
 }
 
+TEST_F(BusServerTest, AsksTheBusOnceAboutACaller) {
+    const auto caller = connect();
+    for (std::uint64_t operation = 1; operation <= 3; ++operation) send(caller.get(), operation);
+    runUntil([&] { return exchanges.waiting.size() == 3; });
+
+    for (std::size_t which = 0; which < 3; ++which) {
+        EXPECT_EQ(exchanges.waiting[which].caller.process, getpid());
+        answer(which, 0);
+    }
+    send(caller.get(), 4);
+    runUntil([&] { return exchanges.waiting.size() == 4; });
+    answer(3, 0);
+    runUntil([&] { return replies.size() == 4; });
+
+    EXPECT_EQ(numbersOfReplies[3], numbersOfReplies[2] + 1) << "it has sent something in between";
+}
+
+TEST_F(BusServerTest, PassesOverWhatWantsNoAnswer) {
+    const auto caller = connect();
+
+    sendAndWantNoAnswer(caller.get(), nameOf(serverBus.get()), 1);
+    send(caller.get(), 2);
+    runUntil([&] { return !exchanges.waiting.empty(); });
+
+    EXPECT_EQ(exchanges.waiting[0].request.message.unsignedInteger("op"), 2u);
+}
+
 TEST_F(BusServerTest, BoundsWhatOneUserMayHaveWaiting) {
     const auto caller = connect();
     for (std::size_t sent = 0; sent < BusServer::kMostWaitingOfOneUser + 3; ++sent)

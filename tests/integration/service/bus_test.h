@@ -66,15 +66,13 @@ protected:
     }
 
     void send(sd_bus* from, const std::string& to, std::uint64_t operation) {
-        sd_bus_message* made = nullptr;
-        sd_bus_message_new_method_call(from, &made, to.c_str(), kObjectPath, kHintsInterface,
-                                       "Exchange");
-        const platform::SdBusMessage call(made);
-        platform::Message request;
-        request.set("op", operation);
-        std::string reason;
-        ASSERT_TRUE(platform::appendDictionary(made, request, reason)) << reason;
-        ASSERT_GE(sd_bus_call_async(from, nullptr, made, onReply, this, UINT64_MAX), 0);
+        const auto call = callTo(from, to, operation);
+        ASSERT_GE(sd_bus_call_async(from, nullptr, call.get(), onReply, this, UINT64_MAX), 0);
+    }
+    void sendAndWantNoAnswer(sd_bus* from, const std::string& to, std::uint64_t operation) {
+        const auto call = callTo(from, to, operation);
+        sd_bus_message_set_expect_reply(call.get(), 0);
+        ASSERT_GE(sd_bus_send(from, call.get(), nullptr), 0);
     }
 
     void runUntil(const std::function<bool()>& isSo) {
@@ -86,11 +84,26 @@ protected:
     }
 
 private:
+    static platform::SdBusMessage callTo(sd_bus* from, const std::string& to,
+                                         std::uint64_t operation) {
+        sd_bus_message* made = nullptr;
+        sd_bus_message_new_method_call(from, &made, to.c_str(), kObjectPath, kHintsInterface,
+                                       "Exchange");
+        platform::SdBusMessage call(made);
+        platform::Message request;
+        request.set("op", operation);
+        std::string reason;
+        EXPECT_TRUE(platform::appendDictionary(made, request, reason)) << reason;
+        return call;
+    }
     static int onReply(sd_bus_message* message, void* self, sd_bus_error*) {
         std::string reason;
         const auto read = platform::readDictionary(message, reason);
-        static_cast<BusTest*>(self)->replies.push_back(
-            read ? read->message.integer("res").value_or(-1) : -2);
+        auto& test = *static_cast<BusTest*>(self);
+        test.replies.push_back(read ? read->message.integer("res").value_or(-1) : -2);
+        std::uint64_t number = 0;
+        sd_bus_message_get_cookie(message, &number);
+        test.numbersOfReplies.push_back(number);
         return 1;
     }
 
@@ -101,6 +114,8 @@ private:
 protected:
     test::PrivateBus bus;
     std::vector<std::int64_t> replies;
+    // Each among all the messages that its sender has sent.
+    std::vector<std::uint64_t> numbersOfReplies;
 
 private:
     std::unique_ptr<sd_event, EventUnref> _event;

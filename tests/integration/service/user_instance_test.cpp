@@ -100,6 +100,23 @@ protected:
     HintsMachine machine;
 };
 
+TEST_F(UserInstanceTest, ShowsItsMemoryToNoOtherProgramOfItsUser) {
+    start(machine.answeringPinentry());
+    const Child open({"sleep", "60"}, machine.options(kNobodyUser));
+    const auto read = [&](const Child& program) {
+        // The kernel asks the same for each file that shows memory.
+        const auto file = "/proc/" + std::to_string(program.pid()) + "/environ";
+        return run({"cat", file}, machine.options(kNobodyUser));
+    };
+
+    // Until it runs the program it is closed, too.
+    EXPECT_TRUE(eventually([&] { return read(open).status == 0; }));
+
+    const auto refused = read(machine.agent());
+    EXPECT_NE(refused.status, 0);
+    EXPECT_THAT(refused.errors, HasSubstr("Permission denied"));
+}
+
 TEST_F(UserInstanceTest, PassesListingsOn) {
     start(machine.answeringPinentry());
 
