@@ -29,7 +29,9 @@ namespace vlm::service {
 class BusServer {
 public:
     static constexpr std::size_t kMostWaitingOfOneUser = 64;
-    static constexpr std::size_t kMostWaiting = 512;
+    // Each has its caller watched, and the bus ends a connection that wants to be told of more than
+    // 512 things.
+    static constexpr std::size_t kMostWaiting = 384;
 
     // The names are literals.
     BusServer(sd_bus* bus, const char* interface, const char* method, Exchanges& exchanges);

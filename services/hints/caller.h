@@ -4,8 +4,8 @@
 // program that is gone.
 //
 // Threads:   the event loop's.
-// Blocking:  watch() asks the bus once.
-// Errors:    a caller that is gone already has no watch.
+// Blocking:  never.
+// Errors:    a caller that cannot be watched has no watch.
 // Behind it: services/hints/bus_caller_watch.h
 // In tests:  tests/fakes/fake_caller_watch.h
 
@@ -39,7 +39,8 @@ public:
 
     virtual ~CallerWatch() = default;
 
-    // Calls `left` once, when the connection is gone. Null, and no call, when it is gone already.
+    // Calls `left` once, when the connection is gone; never before this has returned. Null, and no
+    // call, when it cannot be watched: it may be gone already.
     virtual std::unique_ptr<Watch> watch(const std::string& connection,
                                          std::function<void()> left) = 0;
 };

@@ -1,5 +1,7 @@
 // vlmhintsd: the hints service, as the machine's daemon or as one user's instance.
 
+#include <malloc.h>
+
 #include <cstdlib>
 #include <iostream>
 #include <string>
@@ -10,6 +12,14 @@
 #include "services/hints/options.h"
 #include "services/hints/service_loop.h"
 
+namespace {
+
+// The C library keeps what a large message took for the next one, once it has seen some, and
+// anybody may send one.
+void giveLargeBlocksBack() { mallopt(M_MMAP_THRESHOLD, 128 << 10); }
+
+}  // namespace
+
 int main(int argc, char* argv[]) {
     using namespace vlm::service;
     const auto parsed = parseOptions(std::vector<std::string>(argv + 1, argv + argc));
@@ -19,6 +29,7 @@ int main(int argc, char* argv[]) {
     }
 
     closeToOthers();
+    giveLargeBlocksBack();
     ServiceLoop loop;
     if (!loop.get()) {
         std::cerr << "vlmhintsd: the system has no room for an event loop\n";

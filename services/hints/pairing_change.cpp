@@ -40,12 +40,18 @@ const char* whyNotAsked(SessionState state) {
     return "";
 }
 
+// The question has the name in quotes, and what follows them is ours to say.
+std::string quotable(std::string name) {
+    std::ranges::replace(name, '"', '\'');
+    return name;
+}
+
 // Empty when no inserted card has the key.
 std::string cardWith(const Bytes& hash, const std::vector<Token>& tokens) {
     for (const auto& token : tokens)
         if (std::ranges::find(token.identities, hash, &Identity::publicKeyHash) !=
             token.identities.end())
-            return platform::harmlessText(token.name, kMostCardCharacters);
+            return quotable(platform::harmlessText(token.name, kMostCardCharacters));
     return {};
 }
 

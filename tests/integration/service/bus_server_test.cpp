@@ -169,7 +169,19 @@ TEST_F(BusServerTest, NoticesThatACallerLeaves) {
     runUntil([&] { return left > 0; });
 
     EXPECT_EQ(left, 1);
-    EXPECT_FALSE(callers.watch(connection, [&] { ++left; }));
+}
+
+TEST_F(BusServerTest, NoticesThatACallerHasLeftAlready) {
+    BusCallerWatch callers(serverBus.get());
+    const auto connection = nameOf(connect().get());
+    int left = 0;
+
+    const auto watch = callers.watch(connection, [&] { ++left; });
+    EXPECT_EQ(left, 0);
+    runUntil([&] { return left > 0; });
+    runUntilQuiet();
+
+    EXPECT_EQ(left, 1);
 }
 
 TEST_F(BusServerTest, LetsAWatchBeDroppedByItsOwnCall) {

@@ -26,12 +26,31 @@ def requests_that_want_no_answer_keep_nobody_out(lab):
     _others_are_served(lab, "unanswered")
 
 
+def logins_keep_nobody_out(lab):
+    _others_are_served(lab, "logins")
+
+
 def registrations_keep_nobody_out(lab):
     _others_are_served(lab, "registrations")
 
 
 def malformed_messages_keep_nobody_out(lab):
     _others_are_served(lab, "malformed")
+
+
+def big_messages_are_not_kept(lab):
+    """The bus itself refuses more than it keeps for one receiver, whoever sends it; so some of alice's
+    requests may get lost there, and the time is not asked for."""
+    pair(lab, "alice", present(lab, "rsa", "Alice Archer"))
+    before = _memory(lab, daemon_pid(lab))
+
+    with nothing_changes(lab), _flood(lab, "bob", "big"):
+        _milliseconds(lab)
+
+    lab.wait_until(
+        "what they took is given back",
+        lambda: _memory(lab, daemon_pid(lab)) < before + GROWTH_KIB,
+    )
 
 
 def connections_keep_nobody_out(lab):
@@ -96,4 +115,4 @@ def _flood(lab, user: str, what: str):
         yield
         sent = int(flood.end())
     print(f"{what}: {sent} were sent")
-    check.assertGreater(sent, 100)
+    check.assertGreater(sent, 10)

@@ -72,6 +72,17 @@ TEST_F(PairingChangeTest, TellsTheAdministratorWhatIsAsked) {
                                               Pair("key", "0101010101010101...")));
 }
 
+TEST_F(PairingChangeTest, LetsNoCardEndItsNameInTheQuestion) {
+    tokens.insert(tokenOf("pkcs11:token=c", "C\" (key 0000) with the account bob. \"",
+                          {identityOf(7, "Alice")}));
+    pairings.pair("alice", hashOf(7), kNow);
+
+    ask(alice(), unpair("alice", 7));
+
+    EXPECT_EQ(authority.questions.at(0).details.at("card"),
+              "C' (key 0000) with the account bob. '");
+}
+
 TEST_F(PairingChangeTest, TellsTheAdministratorOfAKeyWhoseCardIsNotInserted) {
     pairings.pair("alice", hashOf(7), kNow);
     ask(alice(), unpair("alice", 7));
