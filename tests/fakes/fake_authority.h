@@ -1,11 +1,11 @@
 #pragma once
 
-#include <algorithm>
 #include <memory>
 #include <string>
 #include <utility>
 #include <vector>
 
+#include "open_questions.h"
 #include "services/hints/authority.h"
 
 namespace vlm::fakes {
@@ -22,41 +22,18 @@ public:
 
     // What happened.
     std::vector<service::RightQuestion> questions;
-    std::size_t open() const { return _open.size(); }
-    int withdrawn = 0;
+    std::size_t open() const { return _open.count(); }
+    int withdrawn() const { return _open.withdrawn(); }
 
     std::unique_ptr<Question> ask(const service::RightQuestion& question, Answer answer) override {
         questions.push_back(question);
-        auto asked = std::make_unique<FakeQuestion>(*this, std::move(answer));
-        _open.push_back(asked.get());
-        return asked;
+        return _open.add(std::move(answer));
     }
 
 private:
-    class FakeQuestion final : public Question {
-    public:
-        FakeQuestion(FakeAuthority& authority, Answer answer)
-            : _authority(authority), _answer(std::move(answer)) {}
-        FakeQuestion(const FakeQuestion&) = delete;
-        FakeQuestion& operator=(const FakeQuestion&) = delete;
-        ~FakeQuestion() override {
-            if (std::erase(_authority._open, this) > 0) ++_authority.withdrawn;
-        }
+    void answer(service::RightVerdict verdict) { _open.answerOldest(std::move(verdict)); }
 
-        Answer takeAnswer() { return std::exchange(_answer, nullptr); }
-
-    private:
-        FakeAuthority& _authority;
-        Answer _answer;
-    };
-
-    void answer(service::RightVerdict verdict) {
-        auto* oldest = _open.at(0);
-        _open.erase(_open.begin());
-        oldest->takeAnswer()(std::move(verdict));
-    }
-
-    std::vector<FakeQuestion*> _open;
+    OpenQuestions<Question, service::RightVerdict> _open;
 };
 
 }  // namespace vlm::fakes

@@ -1,10 +1,9 @@
 #pragma once
 
-#include <algorithm>
 #include <memory>
 #include <utility>
-#include <vector>
 
+#include "open_questions.h"
 #include "services/hints/caller_sessions.h"
 
 namespace vlm::fakes {
@@ -16,38 +15,17 @@ public:
 
     // Answers everything that was asked.
     void settle() {
-        while (!_open.empty()) {
-            auto* oldest = _open.front();
-            _open.erase(_open.begin());
-            oldest->takeAnswer()(state);
-        }
+        while (open() > 0) _open.answerOldest(state);
     }
 
-    std::size_t open() const { return _open.size(); }
+    std::size_t open() const { return _open.count(); }
 
     std::unique_ptr<Question> ask(const service::Caller&, Answer answer) override {
-        auto asked = std::make_unique<FakeQuestion>(*this, std::move(answer));
-        _open.push_back(asked.get());
-        return asked;
+        return _open.add(std::move(answer));
     }
 
 private:
-    class FakeQuestion final : public Question {
-    public:
-        FakeQuestion(FakeCallerSessions& sessions, Answer answer)
-            : _sessions(sessions), _answer(std::move(answer)) {}
-        FakeQuestion(const FakeQuestion&) = delete;
-        FakeQuestion& operator=(const FakeQuestion&) = delete;
-        ~FakeQuestion() override { std::erase(_sessions._open, this); }
-
-        Answer takeAnswer() { return std::exchange(_answer, nullptr); }
-
-    private:
-        FakeCallerSessions& _sessions;
-        Answer _answer;
-    };
-
-    std::vector<FakeQuestion*> _open;
+    OpenQuestions<Question, service::SessionState> _open;
 };
 
 }  // namespace vlm::fakes

@@ -1,11 +1,11 @@
 #pragma once
 
-#include <algorithm>
 #include <memory>
 #include <string>
 #include <utility>
 #include <vector>
 
+#include "open_questions.h"
 #include "services/hints/pin_prompt.h"
 
 namespace vlm::fakes {
@@ -28,44 +28,18 @@ public:
 
     // What happened.
     std::vector<service::PinQuestion> questions;
-    std::size_t open() const { return _open.size(); }
-    int held = 0;  // questions that the asking side has not let go of
+    std::size_t open() const { return _open.count(); }
+    int held() const { return _open.held(); }
 
     std::unique_ptr<Question> ask(const service::PinQuestion& question, Answer answer) override {
         questions.push_back(question);
-        auto asked = std::make_unique<FakeQuestion>(*this, std::move(answer));
-        _open.push_back(asked.get());
-        return asked;
+        return _open.add(std::move(answer));
     }
 
 private:
-    class FakeQuestion final : public Question {
-    public:
-        FakeQuestion(FakePinPrompt& prompt, Answer answer)
-            : _prompt(prompt), _answer(std::move(answer)) {
-            ++_prompt.held;
-        }
-        FakeQuestion(const FakeQuestion&) = delete;
-        FakeQuestion& operator=(const FakeQuestion&) = delete;
-        ~FakeQuestion() override {
-            std::erase(_prompt._open, this);
-            --_prompt.held;
-        }
+    void give(service::PinAnswer answer) { _open.answerOldest(std::move(answer)); }
 
-        Answer takeAnswer() { return std::exchange(_answer, nullptr); }
-
-    private:
-        FakePinPrompt& _prompt;
-        Answer _answer;
-    };
-
-    void give(service::PinAnswer answer) {
-        auto* oldest = _open.at(0);
-        _open.erase(_open.begin());
-        oldest->takeAnswer()(std::move(answer));
-    }
-
-    std::vector<FakeQuestion*> _open;
+    OpenQuestions<Question, service::PinAnswer> _open;
 };
 
 }  // namespace vlm::fakes

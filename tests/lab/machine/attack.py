@@ -17,6 +17,7 @@ NOT_PERMITTED = "-2001"
 @contextmanager
 def nothing_changes(lab):
     """Neither pairings, their file nor settings; the daemon is the same, and serves."""
+    check.assertEqual(lab.root("vlmbind", "-i").status, 0)  # From here on it has its file.
     before = _state(lab)
     yield
     check.assertEqual(_state(lab), before)

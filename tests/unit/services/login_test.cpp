@@ -46,7 +46,7 @@ TEST_F(LoginTest, AsksForThePinAndNamesCardAndIdentity) {
     EXPECT_EQ(prompt.questions[0].caller.user, 1000u);
 
     prompt.enter("123456");
-    EXPECT_EQ(prompt.held, 0) << "the prompt is gone while the card works";
+    EXPECT_EQ(prompt.held(), 0) << "the prompt is gone while the card works";
     tokens.settle();
 
     EXPECT_EQ(result(lastReply()), 0);

@@ -220,7 +220,7 @@ TEST_F(PairingChangeTest, WithdrawsTheQuestionOfACallerWhoLeft) {
 
     callers.leave(alice().connection);
 
-    EXPECT_EQ(authority.withdrawn, 1);
+    EXPECT_EQ(authority.withdrawn(), 1);
     EXPECT_FALSE(lastReply());
     EXPECT_TRUE(pairings.all().empty());
 }
