@@ -189,11 +189,16 @@ TEST_F(BindDialogDescription, IsAsLargeAsItsTextsNeed) {
 
 TEST_F(BindDialogDescription, ShowsALockWithTheBadgeInItsCorner) {
     auto& icon = part<QLabel>("iconView");
-    window->iconView("iconView")->showSecurityLock("NoSuchPicture", 32);
-    const QImage without = icon.pixmap().toImage();
-
-    window->iconView("iconView")->showSecurityLock("AppIcon", 32);
-    const QImage with = icon.pixmap().toImage();
+    window->makeKeyAndOrderFront();
+    const auto lockWith = [&](const char* badge) {
+        icon.clear();
+        window->iconView("iconView")->showSecurityLock(badge, 32);
+        EXPECT_TRUE(icon.pixmap().isNull()) << "it waits until the window is painted";
+        EXPECT_TRUE(QTest::qWaitFor([&] { return !icon.pixmap().isNull(); }));
+        return icon.pixmap().toImage();
+    };
+    const QImage without = lockWith("NoSuchPicture");
+    const QImage with = lockWith("AppIcon");
 
     ASSERT_EQ(with.size(), QSize(64, 64));
     EXPECT_NE(without.pixelColor(32, 30).alpha(), 0) << "there is no lock";
