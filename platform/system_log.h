@@ -1,8 +1,8 @@
 // SystemLog: where this system's log lines go, and Log, the handle that components write through.
 //
 // Shapes:    a record has a subsystem, a category, a level, one text (UTF-8; it may hold line
-// feeds)
-//            and, where there is one, the activity that it belongs to. Secrets never come here.
+//            feeds) and, where there is one, the activity that it belongs to. Secrets never come
+//            here.
 // Threads:   any.
 // Blocking:  no; a line that cannot be delivered at once is lost.
 // Errors:    none are reported: logging never fails its caller.

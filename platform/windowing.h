@@ -5,8 +5,7 @@
 // disabled.
 //
 // Ownership: a window belongs to whoever loaded it, and its views to the window. It may be let go
-// at
-//            any time, also from within what it calls; it calls nothing after that.
+//            at any time, also from within what it calls; it calls nothing after that.
 // Threads:   the main queue's only.
 // Blocking:  loading a window may load the toolkit; nothing else does. A sheet is answered later.
 // Errors:    a window that cannot be loaded is null, and the reason is in the log. A name that a

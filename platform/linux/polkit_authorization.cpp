@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "platform/linux/exchange_failure.h"
+#include "platform/linux/polkit_verdict.h"
 #include "platform/linux/sd_bus_call.h"
 #include "platform/linux/sd_bus_handles.h"
 #include "platform/platform.h"
@@ -19,8 +20,6 @@ namespace {
 
 constexpr Log kLog(kTokenFramework, "vlmbind");
 
-constexpr std::uint32_t kAllowUserInteraction = 1;
-
 std::string systemText(int result) { return std::generic_category().message(-result); }
 
 ExchangeFailures failures() { return {kAuthority, ServiceScope::Machine}; }
@@ -30,40 +29,10 @@ Status failed(std::string_view what, const ExchangeFailure& failure) {
     return kAuthorizationFailed;
 }
 
-// What polkit answers.
-struct Verdict {
-    bool isAuthorized = false;
-    bool isChallenge = false;  // a person could be asked, and was not
-    bool isDismissed = false;
-
-    Status status() const {
-        if (isAuthorized) return kSuccess;
-        if (isDismissed) return kAuthorizationCanceled;
-        return isChallenge ? kInteractionNotAllowed : kAuthorizationDenied;
-    }
-};
-
-int readDetails(sd_bus_message* answer, Verdict& verdict) {
-    int result = sd_bus_message_enter_container(answer, 'a', "{ss}");
-    while (result >= 0) {
-        const char* name = nullptr;
-        const char* value = nullptr;
-        result = sd_bus_message_read(answer, "{ss}", &name, &value);
-        if (result == 0) return 0;
-        if (result > 0 && std::string_view(name) == "polkit.dismissed") verdict.isDismissed = true;
-    }
-    return result;
-}
-
-int readVerdict(sd_bus_message* answer, Verdict& verdict) {
-    int isAuthorized = 0;
-    int isChallenge = 0;
-    int result = sd_bus_message_enter_container(answer, 'r', "bba{ss}");
-    if (result >= 0) result = sd_bus_message_read(answer, "bb", &isAuthorized, &isChallenge);
-    if (result < 0) return result;
-    verdict.isAuthorized = isAuthorized != 0;
-    verdict.isChallenge = isChallenge != 0;
-    return readDetails(answer, verdict);
+Status statusOf(const PolkitVerdict& verdict) {
+    if (verdict.isAuthorized) return kSuccess;
+    if (verdict.isDismissed) return kAuthorizationCanceled;
+    return verdict.isChallenge ? kInteractionNotAllowed : kAuthorizationDenied;
 }
 
 class PolkitSession final : public AuthorizationSession {
@@ -90,10 +59,10 @@ Status PolkitSession::request(std::string_view right, AuthorizationFlags flags) 
     if (const sd_bus_error* error = sd_bus_message_get_error(answer.get()))
         return failed(what,
                       failures().errorReply(error->name, error->message ? error->message : ""));
-    Verdict verdict;
-    result = readVerdict(answer.get(), verdict);
+    PolkitVerdict verdict;
+    result = readPolkitVerdict(answer.get(), verdict);
     if (result < 0) return failed(what, failures().unreadableReply(systemText(result)));
-    return verdict.status();
+    return statusOf(verdict);
 }
 
 // Without details, which are for the mechanism that acts in the end, and without the means to call

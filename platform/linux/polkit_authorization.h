@@ -17,10 +17,6 @@
 
 namespace vlm::platform {
 
-inline constexpr const char* kAuthority = "org.freedesktop.PolicyKit1";
-inline constexpr const char* kAuthorityObject = "/org/freedesktop/PolicyKit1/Authority";
-inline constexpr const char* kAuthorityInterface = "org.freedesktop.PolicyKit1.Authority";
-
 class PolkitAuthorization final : public Authorization {
 public:
     // For the person to find the administrator who types a password; nobody is left with a window

@@ -4,6 +4,7 @@
 #include <string>
 #include <utility>
 
+#include "platform/linux/polkit_verdict.h"
 #include "platform/text.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/service_names.h"
@@ -13,55 +14,29 @@ namespace vlm::service {
 
 namespace {
 
-constexpr const char* kPolkit = "org.freedesktop.PolicyKit1";
-constexpr const char* kPath = "/org/freedesktop/PolicyKit1/Authority";
-constexpr const char* kInterface = "org.freedesktop.PolicyKit1.Authority";
-constexpr std::uint32_t kAllowUserInteraction = 1;
+using platform::kAuthority, platform::kAuthorityInterface, platform::kAuthorityObject;
 constexpr std::uint64_t kNoTimeOut = UINT64_MAX;
 
 RightVerdict failed(std::string reason) {
     return {RightVerdict::Outcome::Failed, {}, std::move(reason)};
 }
 
-// What polkit says besides yes and no.
-struct Details {
-    std::string keptId;
-    bool isDismissed = false;
-};
-
-int readDetails(sd_bus_message* reply, Details& details) {
-    int code = sd_bus_message_enter_container(reply, 'a', "{ss}");
-    if (code < 0) return code;
-    const char* key = nullptr;
-    const char* value = nullptr;
-    while ((code = sd_bus_message_read(reply, "{ss}", &key, &value)) > 0) {
-        const std::string_view name = key;
-        if (name == "polkit.temporary_authorization_id") details.keptId = value;
-        if (name == "polkit.dismissed") details.isDismissed = true;
-    }
-    return code;
-}
-
 RightVerdict verdictOf(sd_bus_message* reply) {
     if (const auto* error = sd_bus_message_get_error(reply))
         return failed(error->message ? error->message : error->name);
-    int isAuthorized = 0;
-    int isChallenge = 0;
-    Details details;
-    int code = sd_bus_message_enter_container(reply, 'r', "bba{ss}");
-    if (code >= 0) code = sd_bus_message_read(reply, "bb", &isAuthorized, &isChallenge);
-    if (code >= 0) code = readDetails(reply, details);
-    if (code < 0) return failed("its answer cannot be understood");
+    platform::PolkitVerdict verdict;
+    if (platform::readPolkitVerdict(reply, verdict) < 0)
+        return failed("its answer cannot be understood");
 
     using Outcome = RightVerdict::Outcome;
     // Another polkit gives the same ids again.
     const char* sender = sd_bus_message_get_sender(reply);
-    if (isAuthorized && !details.keptId.empty())
+    if (verdict.isAuthorized && !verdict.keptId.empty())
         return {
-            Outcome::Granted, platform::text("{} {}", sender ? sender : "", details.keptId), {}};
-    if (isAuthorized) return {Outcome::Granted, {}, {}};
-    if (details.isDismissed) return {Outcome::Dismissed, {}, {}};
-    return {isChallenge ? Outcome::NobodyToAsk : Outcome::Denied, {}, {}};
+            Outcome::Granted, platform::text("{} {}", sender ? sender : "", verdict.keptId), {}};
+    if (verdict.isAuthorized) return {Outcome::Granted, {}, {}};
+    if (verdict.isDismissed) return {Outcome::Dismissed, {}, {}};
+    return {verdict.isChallenge ? Outcome::NobodyToAsk : Outcome::Denied, {}, {}};
 }
 
 int appendDetail(sd_bus_message* call, const std::string& key, const std::string& value) {
@@ -107,14 +82,15 @@ public:
 private:
     int send(const RightQuestion& question) {
         sd_bus_message* made = nullptr;
-        int code = sd_bus_message_new_method_call(_bus, &made, kPolkit, kPath, kInterface,
-                                                  "CheckAuthorization");
+        int code = sd_bus_message_new_method_call(_bus, &made, kAuthority, kAuthorityObject,
+                                                  kAuthorityInterface, "CheckAuthorization");
         const platform::SdBusMessage call(made);
         if (code >= 0)
             code = sd_bus_message_append(made, "(sa{sv})s", "system-bus-name", 1, "name", "s",
                                          question.caller.connection.c_str(), kAdministratorRight);
         if (code >= 0) code = appendDetails(made, question);
-        if (code >= 0) code = sd_bus_message_append(made, "us", kAllowUserInteraction, _id.c_str());
+        if (code >= 0)
+            code = sd_bus_message_append(made, "us", platform::kAllowUserInteraction, _id.c_str());
         sd_bus_slot* slot = nullptr;
         if (code >= 0) code = sd_bus_call_async(_bus, &slot, made, onReply, this, kNoTimeOut);
         _call.reset(slot);
@@ -123,9 +99,9 @@ private:
 
     // The person is not left with a question that nobody waits for.
     void withdraw() {
-        if (sd_bus_call_method_async(_bus, nullptr, kPolkit, kPath, kInterface,
-                                     "CancelCheckAuthorization", onWithdrawn, nullptr, "s",
-                                     _id.c_str()) < 0)
+        if (sd_bus_call_method_async(_bus, nullptr, kAuthority, kAuthorityObject,
+                                     kAuthorityInterface, "CancelCheckAuthorization", onWithdrawn,
+                                     nullptr, "s", _id.c_str()) < 0)
             kLog.error("a question for the administrator's right cannot be withdrawn");
     }
 

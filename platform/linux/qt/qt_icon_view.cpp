@@ -5,7 +5,6 @@
 #include <QPainter>
 #include <QTimer>
 #include <functional>
-#include <string>
 #include <utility>
 
 #include "platform/linux/qt/installed_resources.h"

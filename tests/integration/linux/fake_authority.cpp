@@ -2,7 +2,7 @@
 
 #include <stdexcept>
 
-#include "platform/linux/polkit_authorization.h"
+#include "platform/linux/polkit_verdict.h"
 #include "tests/integration/linux/bus_service.h"
 #include "tests/integration/linux/child.h"
 
