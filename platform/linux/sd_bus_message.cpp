@@ -1,7 +1,6 @@
 #include "platform/linux/sd_bus_message.h"
 
 #include <fcntl.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -9,6 +8,7 @@
 #include <system_error>
 #include <utility>
 
+#include "platform/linux/owned_endpoint.h"
 #include "platform/text.h"
 #include "platform/utf.h"
 
@@ -32,12 +32,9 @@ bool canTravel(std::string_view text) {
 
 // Endpoint for a descriptor that somebody else keeps; none when no further one can be opened.
 std::optional<Endpoint> duplicated(int descriptor) {
-    const int own = ::fcntl(descriptor, F_DUPFD_CLOEXEC, 3);
-    if (own < 0) return std::nullopt;
-    return Endpoint{std::shared_ptr<const int>(new int(own), [](const int* number) {
-        ::close(*number);
-        delete number;
-    })};
+    FileDescriptor own(::fcntl(descriptor, F_DUPFD_CLOEXEC, 3));
+    if (!own) return std::nullopt;
+    return ownedEndpoint(std::move(own));
 }
 
 std::string tooLargeReason() { return text("it is larger than {} bytes", kMostDictionaryBytes); }

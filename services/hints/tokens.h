@@ -17,6 +17,7 @@
 
 #include <cstdint>
 #include <functional>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -42,6 +43,14 @@ struct Identity {
     bool operator==(const Identity&) const = default;
 };
 
+// How a token's wrap key opens what was wrapped with its public half. The numbers are those of the
+// stored form.
+enum class WrapScheme : std::uint8_t {
+    RsaOaepSha256 = 1,  // OAEP, SHA-256 and MGF1 with SHA-256, no label
+    RsaPkcs1 = 2,       // PKCS#1 v1.5, for a card that can do no other
+    Ecdh = 3,           // ECDH with an ephemeral key
+};
+
 enum class PinState { Ready, FewTriesLeft, LastTry, Locked };
 
 struct Token {
@@ -51,8 +60,19 @@ struct Token {
     bool needsLogin = true;
     PinState pinState = PinState::Ready;
     std::vector<Identity> identities;  // sorted by hash, each hash once
-    std::optional<Bytes> wrapKeyHash;  // an RSA key that may decrypt, or an EC key that may derive
+    // The identity whose key can wrap: an RSA key that may decrypt, or an EC key that may derive.
+    std::optional<Bytes> wrapKeyHash;
+    WrapScheme wrapScheme = WrapScheme::RsaOaepSha256;  // the best that this key and card can do
     bool operator==(const Token&) const = default;
+};
+
+// What the card's wrap key is to open after it has signed, in the same login.
+struct OpenRequest {
+    Bytes wrapKeyHash;
+    WrapScheme scheme = WrapScheme::RsaOaepSha256;
+    Bytes
+        sealed;  // RSA: what was encrypted; ECDH: the ephemeral point, uncompressed (SEC 1, 2.3.3)
+    bool operator==(const OpenRequest&) const = default;
 };
 
 // A signature by one key of one token over a challenge, asked of the card with a PIN.
@@ -61,6 +81,7 @@ struct ProofRequest {
     Bytes publicKeyHash;
     Bytes challenge;  // what the card signs (SHA-256 and PKCS#1 v1.5 for RSA, ECDSA for EC)
     Secret pin;       // empty when the reader asks for it, or the token needs none
+    std::optional<OpenRequest> open = {};
 };
 
 struct Proof {
@@ -77,6 +98,11 @@ struct Proof {
     Bytes signature;  // DER for ECDSA
     PinState pinStateAfter = PinState::Ready;
     std::string reason;  // why it failed, for people; holds no secret
+
+    // What the wrap key made of the request to open: the decrypted bytes, or the first coordinate
+    // of the common point. None when nothing was asked, or it failed, which spoils no signature.
+    std::shared_ptr<const Secret> opened = {};
+    std::string whyNotOpened = {};
 };
 
 // When a listing has to be asked for again by who wants to know of every token. The numbers are

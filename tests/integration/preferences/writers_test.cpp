@@ -131,8 +131,11 @@ TEST_F(PreferencesWritersTest, AReaderNeverSeesHalfAFile) {
     int last = -1;
     int changes = 0;
 
-    const auto end = std::chrono::steady_clock::now() + 500ms;
-    while (std::chrono::steady_clock::now() < end) {
+    constexpr int kEnough = 10;
+    const auto start = std::chrono::steady_clock::now();
+    const auto elapsed = [start] { return std::chrono::steady_clock::now() - start; };
+    // A busy machine may keep the writer waiting.
+    while (elapsed() < 500ms || (changes < kEnough && elapsed() < 60s)) {
         const auto whole = TestFolders::read(file());
         ASSERT_TRUE(whole && whole->dictionary());
         const auto* first = whole->dictionary()->find("a");
@@ -145,7 +148,7 @@ TEST_F(PreferencesWritersTest, AReaderNeverSeesHalfAFile) {
         last = number;
     }
 
-    EXPECT_GT(changes, 10) << "there was nothing to see";
+    EXPECT_GE(changes, kEnough) << "there was nothing to see";
 }
 
 TEST_F(PreferencesWritersTest, AWriterThatHangsStopsTheOthersForABoundedTimeOnly) {
