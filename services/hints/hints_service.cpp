@@ -7,7 +7,9 @@
 #include "platform/accounts.h"
 #include "platform/platform.h"
 #include "services/hints/account_spelling.h"
+#include "services/hints/card_login.h"
 #include "services/hints/hints_log.h"
+#include "services/hints/login_search.h"
 #include "services/hints/permission.h"
 #include "services/hints/reply.h"
 #include "services/hints/request.h"
@@ -65,6 +67,11 @@ void HintsService::serve(const Caller& caller, Request request, const Answer& an
             return listPairings(request, answer);
         case Operation::IsPaired:
             return answer(isPaired(request));
+        case Operation::FindLoginCard:
+            return findLoginCard(caller, std::move(request), answer);
+        case Operation::CardLogin:
+            return logInWithCard(caller, std::move(request), answer);
+        case Operation::SessionLogin:
         case Operation::UnlockKeybag:
         case Operation::TokenEndpoints:
             return answer(refused(status::kNotServed, request, "this service does not do that."));
@@ -75,11 +82,39 @@ void HintsService::login(const Caller& caller, Request request, const Answer& an
     const auto number = begin(caller);
     if (!number) return;
     const auto done = [this, number = *number, user = caller.user, hash = request.hash,
-                       answer](const std::optional<Refusal>& refusal) {
-        if (!refusal) _parts.changes.proofs.remember(user, hash);
-        end(number, refusal, answer);
+                       answer](const Outcome<Login::Proved>& proved) {
+        if (!proved) return end(number, proved.refusal(), answer);
+        _parts.changes.proofs.remember(user, hash);
+        end(number, numberReply(status::kSuccess), answer);
     };
-    const auto login = std::make_shared<Login>(_parts.login, caller, std::move(request), done);
+    const auto login =
+        std::make_shared<Login>(_parts.login, caller, std::move(request), std::nullopt, done);
+    _running[*number].work = login;
+    login->start();
+}
+
+void HintsService::findLoginCard(const Caller& caller, Request request, const Answer& answer) {
+    const auto number = begin(caller);
+    if (!number) return;
+    const auto search = std::make_shared<LoginSearch>(
+        _parts.login.tokens, _parts.changes.sessions, _loginPolicy, caller, std::move(request),
+        [this, number = *number, answer](Outcome<Message> outcome) {
+            end(number, std::move(outcome), answer);
+        });
+    _running[*number].work = search;
+    search->start();
+}
+
+void HintsService::logInWithCard(const Caller& caller, Request request, const Answer& answer) {
+    const auto number = begin(caller);
+    if (!number) return;
+    const CardLoginParts parts{_parts.login, _parts.changes.sessions, _loginPolicy,
+                               _parts.unlockKeys};
+    const auto login = std::make_shared<CardLogin>(
+        parts, caller, std::move(request),
+        [this, number = *number, answer](Outcome<Message> outcome) {
+            end(number, std::move(outcome), answer);
+        });
     _running[*number].work = login;
     login->start();
 }
@@ -88,7 +123,8 @@ void HintsService::changePairing(const Caller& caller, Request request, const An
     const auto number = begin(caller);
     if (!number) return;
     const auto done = [this, number = *number, answer](const std::optional<Refusal>& refusal) {
-        end(number, refusal, answer);
+        if (refusal) return end(number, *refusal, answer);
+        end(number, numberReply(status::kSuccess), answer);
     };
     const auto change =
         std::make_shared<PairingChange>(_parts.changes, caller, std::move(request), done);
@@ -106,11 +142,9 @@ std::optional<std::uint64_t> HintsService::begin(const Caller& caller) {
 }
 
 // Last the answer: it may be the last thing that this service does.
-void HintsService::end(std::uint64_t number, const std::optional<Refusal>& refusal,
-                       const Answer& answer) {
+void HintsService::end(std::uint64_t number, Outcome<Message> outcome, const Answer& answer) {
     const auto ended = _running.extract(number);
-    if (refusal) return answer(*refusal);
-    answer(numberReply(status::kSuccess));
+    answer(std::move(outcome));
 }
 
 void HintsService::describeTokens(const Caller& caller, const Request& request,

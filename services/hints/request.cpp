@@ -7,6 +7,7 @@
 #include "platform/harmless_text.h"
 #include "platform/property_list.h"
 #include "platform/text.h"
+#include "services/hints/secret_pipe.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
@@ -17,6 +18,7 @@ constexpr std::size_t kHashSize = 32;
 constexpr std::size_t kMostAccountName = 256;
 constexpr std::size_t kMostTokenIdentifier = 2048;
 constexpr std::size_t kMostPin = 256;
+constexpr std::size_t kMostSession = 64;
 constexpr std::size_t kMostOtherText = 4096;
 constexpr std::size_t kMostQuery = std::size_t{64} << 10U;
 constexpr platform::PropertyListLimits kQueryLimits = {
@@ -26,7 +28,7 @@ constexpr platform::PropertyListLimits kQueryLimits = {
 class Reader {
 public:
     explicit Reader(const IncomingRequest& incoming) : _incoming(incoming) {
-        for (const auto key : {"op", "uid", "dat1", "str1", "str2", "str3", "num1"})
+        for (const auto key : {"op", "uid", "dat1", "dat2", "str1", "str2", "str3", "num1"})
             if (std::ranges::find(incoming.unreadableKeys, key) != incoming.unreadableKeys.end())
                 refuse(platform::text("\"{}\" is there twice, or of a type that no key has", key));
     }
@@ -81,6 +83,16 @@ public:
         return *value;
     }
 
+    std::optional<Secret> optionalPin(std::string_view key) {
+        if (!isThere(key)) return std::nullopt;
+        const auto pipe = message().endpoint(key);
+        if (!pipe) return missing(key, "a pipe"), std::nullopt;
+        auto pin = secretIn(*pipe);
+        if (!pin || pin->text().size() > kMostPin)
+            refuse(platform::text("\"{}\" is no pipe that holds a PIN", key));
+        return pin;
+    }
+
     // The token that a query of the form {"tokid": token} is restricted to; empty for all tokens.
     std::string queriedToken() {
         if (!isThere("dat1")) return {};
@@ -130,6 +142,19 @@ void readLogin(Reader& reader, Request& request) {
     request.user = reader.user();
 }
 
+void readCardLogin(Reader& reader, Request& request) {
+    request.account = reader.text("str1", kMostAccountName);
+    request.tokenIdentifier = reader.text("str2", kMostTokenIdentifier);
+    request.hash = reader.hash();
+    request.pin = reader.optionalPin("dat2");
+}
+
+void readSessionLogin(Reader& reader, Request& request) {
+    request.session = reader.text("str1", kMostSession);
+    request.account = reader.text("str2", kMostAccountName);
+    request.tokenIdentifier = reader.text("str3", kMostTokenIdentifier);
+}
+
 void readArguments(Reader& reader, Request& request) {
     switch (request.operation) {
         case Operation::Login:
@@ -158,7 +183,33 @@ void readArguments(Reader& reader, Request& request) {
         case Operation::TokenEndpoints:
             request.user = reader.user();
             return;
+        case Operation::FindLoginCard:
+            if (const auto* account = reader.optionalText("str1", kMostAccountName))
+                request.account = *account;
+            return;
+        case Operation::CardLogin:
+            return readCardLogin(reader, request);
+        case Operation::SessionLogin:
+            return readSessionLogin(reader, request);
     }
+}
+
+bool isOperation(std::uint64_t code) {
+    switch (static_cast<Operation>(code)) {
+        case Operation::Login:
+        case Operation::TokenInfo:
+        case Operation::Pair:
+        case Operation::Unpair:
+        case Operation::Pairings:
+        case Operation::UnlockKeybag:
+        case Operation::IsPaired:
+        case Operation::TokenEndpoints:
+        case Operation::FindLoginCard:
+        case Operation::CardLogin:
+        case Operation::SessionLogin:
+            return true;
+    }
+    return false;
 }
 
 }  // namespace
@@ -166,8 +217,7 @@ void readArguments(Reader& reader, Request& request) {
 Outcome<Request> readRequest(const IncomingRequest& incoming) {
     Reader reader(incoming);
     const auto code = reader.number("op");
-    if (code > static_cast<std::uint64_t>(Operation::TokenEndpoints))
-        reader.refuse(platform::text("\"op\" is {}, and operations are 0 to 7", code));
+    if (!isOperation(code)) reader.refuse(platform::text("\"op\" is {}, which is no operation", code));
     if (reader.refusal()) return *reader.refusal();
 
     Request request;
@@ -198,6 +248,13 @@ std::string describe(const Request& request) {
             return platform::text("Asking whether {} is paired", account);
         case Operation::TokenEndpoints:
             return "Watching for cards";
+        case Operation::FindLoginCard:
+            return account.empty() ? "Looking for a card to log in with"
+                                   : platform::text("Looking for a card to log in {} with", account);
+        case Operation::CardLogin:
+            return platform::text("Logging in {} with a card", account);
+        case Operation::SessionLogin:
+            return platform::text("Noting the card that logged in {}", account);
     }
     return {};
 }

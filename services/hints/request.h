@@ -29,15 +29,20 @@ enum class Operation : std::uint64_t {
     UnlockKeybag = 5,
     IsPaired = 6,
     TokenEndpoints = 7,
+    FindLoginCard = 11,
+    CardLogin = 12,
+    SessionLogin = 14,
 };
 
 struct Request {
     Operation operation = Operation::Login;
     platform::UserId user = platform::kNobody;  // Login, TokenInfo, UnlockKeybag, TokenEndpoints
-    platform::Bytes hash;                       // Login, Pair, Unpair
-    std::string account;                        // Pair, Unpair, Pairings, IsPaired
-    std::string tokenIdentifier;                // Login; TokenInfo: empty for all tokens
-    std::optional<Secret> pin;                  // Login, when the caller has it
+    platform::Bytes hash;                       // Login, Pair, Unpair, CardLogin
+    std::string account;          // Pair, Unpair, Pairings, IsPaired, CardLogin, SessionLogin;
+                                  // FindLoginCard: empty for whomever the inserted cards belong to
+    std::string tokenIdentifier;  // Login, CardLogin, SessionLogin; TokenInfo: empty for all tokens
+    std::optional<Secret> pin;    // Login, CardLogin, when the caller has it
+    std::string session;          // SessionLogin
     bool insertedOnly = false;                  // Pairings
     bool asksWhenToLookAgain = false;           // TokenInfo
 };
