@@ -8,10 +8,11 @@
 
 #include "services/hints/pairing_store.h"
 #include "services/hints/status.h"
+#include "services/hints/unlock_key_store.h"
 
 namespace vlm::fakes {
 
-class FakePairingStore final : public service::PairingStore {
+class FakePairingStore final : public service::PairingStore, public service::UnlockKeyStore {
 public:
     // What a test does to the world.
     void breakDown(const std::string& why) {
@@ -47,7 +48,48 @@ public:
         return !found->empty();
     }
 
+    std::optional<service::Refusal> storeUnlockKey(const service::UnlockKey& key) override {
+        if (_broken) return _broken;
+        if (!isThere(key.account, key.hash))
+            return service::Refusal{service::status::kNotPaired, "they are not paired"};
+        forget(key.account, key.hash);
+        _unlockKeys.push_back(key);
+        return std::nullopt;
+    }
+    service::Outcome<std::optional<service::UnlockKey>> unlockKey(
+        const std::string& account, const platform::Bytes& hash) override {
+        if (_broken) return *_broken;
+        for (const auto& key : _unlockKeys)
+            if (key.account == account && key.hash == hash) return std::optional(key);
+        return std::optional<service::UnlockKey>();
+    }
+    service::Outcome<std::vector<service::UnlockKey>> unlockKeysOf(
+        const std::string& account) override {
+        if (_broken) return *_broken;
+        std::vector<service::UnlockKey> found;
+        std::ranges::copy_if(_unlockKeys, std::back_inserter(found),
+                             [&](const auto& key) { return key.account == account; });
+        return found;
+    }
+    service::Outcome<bool> eraseUnlockKey(const std::string& account,
+                                          const platform::Bytes& hash) override {
+        if (_broken) return *_broken;
+        return forget(account, hash);
+    }
+
 private:
+    bool isThere(const std::string& account, const platform::Bytes& hash) const {
+        return std::ranges::any_of(_pairings, [&](const auto& pairing) {
+            return pairing.account == account && pairing.hash == hash;
+        });
+    }
+
+    bool forget(const std::string& account, const platform::Bytes& hash) {
+        return std::erase_if(_unlockKeys, [&](const auto& key) {
+                   return key.account == account && key.hash == hash;
+               }) > 0;
+    }
+
     bool remove(const std::string& account, const platform::Bytes& hash) {
         return std::erase_if(_pairings, [&](const auto& pairing) {
                    return pairing.account == account && pairing.hash == hash;
@@ -64,6 +106,7 @@ private:
     }
 
     std::vector<service::Pairing> _pairings;
+    std::vector<service::UnlockKey> _unlockKeys;
     std::int64_t _last = 0;
     std::optional<service::Refusal> _broken;
 };

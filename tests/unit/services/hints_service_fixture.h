@@ -104,6 +104,7 @@ protected:
             },
             [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
         .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
+        .unlockKeys = pairings,
         .callers = callers,
     }};
 

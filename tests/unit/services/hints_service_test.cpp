@@ -324,6 +324,7 @@ TEST_F(HintsServiceTest, LetsGoOfAnswersThatComeAfterItIsGone) {
         HintsService shortLived{
             {.login = {cards, prompt, {}, {}},
              .changes = {cards, pairings, proofs, sessions, right, [] { return kNow; }},
+             .unlockKeys = pairings,
              .callers = callers}};
         const auto count = [&](const platform::Message&) { ++replies; };
         shortLived.handle(root(), requestOf(1, {{"uid", signedNumber(-1)}}), count);
