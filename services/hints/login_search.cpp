@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "services/hints/login_card_flags.h"
 #include "services/hints/reply.h"
 #include "services/hints/status.h"
 

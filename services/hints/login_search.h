@@ -24,14 +24,6 @@
 
 namespace vlm::service {
 
-// What a reply says of the card, beside its names.
-enum class LoginCardFlag : std::uint8_t {
-    PinPad = 1,  // the reader asks for the PIN itself
-    FewTriesLeft = 2,
-    LastTry = 4,
-    CardRequired = 8,  // the account has no other way in
-};
-
 class LoginSearch : public std::enable_shared_from_this<LoginSearch> {
 public:
     using Done = std::function<void(Outcome<platform::Message>)>;
