@@ -25,14 +25,15 @@ public:
     std::optional<service::Refusal> pair(const std::string& account, const platform::Bytes& hash,
                                          std::int64_t now) override {
         if (_broken) return _broken;
-        remove(account, hash);
+        removePairing(account, hash);
         _pairings.push_back({account, hash, ++_last, now});
         return std::nullopt;
     }
     service::Outcome<bool> unpair(const std::string& account,
                                   const platform::Bytes& hash) override {
         if (_broken) return *_broken;
-        return remove(account, hash);
+        removeUnlockKey(account, hash);
+        return removePairing(account, hash);
     }
     service::Outcome<std::vector<service::Pairing>> pairingsOf(
         const std::string& account) override {
@@ -49,11 +50,18 @@ public:
     }
 
     std::optional<service::Refusal> storeUnlockKey(const service::UnlockKey& key) override {
+        return storeUnlockKeys({key});
+    }
+    std::optional<service::Refusal> storeUnlockKeys(
+        const std::vector<service::UnlockKey>& keys) override {
         if (_broken) return _broken;
-        if (!isThere(key.account, key.hash))
-            return service::Refusal{service::status::kNotPaired, "they are not paired"};
-        forget(key.account, key.hash);
-        _unlockKeys.push_back(key);
+        for (const auto& key : keys)
+            if (!isThere(key.account, key.hash))
+                return service::Refusal{service::status::kNotPaired, "They are not paired."};
+        for (const auto& key : keys) {
+            removeUnlockKey(key.account, key.hash);
+            _unlockKeys.push_back(key);
+        }
         return std::nullopt;
     }
     service::Outcome<std::optional<service::UnlockKey>> unlockKey(
@@ -69,31 +77,31 @@ public:
         std::vector<service::UnlockKey> found;
         std::ranges::copy_if(_unlockKeys, std::back_inserter(found),
                              [&](const auto& key) { return key.account == account; });
+        std::ranges::sort(found, {}, &service::UnlockKey::hash);
         return found;
     }
     service::Outcome<bool> eraseUnlockKey(const std::string& account,
                                           const platform::Bytes& hash) override {
         if (_broken) return *_broken;
-        return forget(account, hash);
+        return removeUnlockKey(account, hash);
     }
 
 private:
-    bool isThere(const std::string& account, const platform::Bytes& hash) const {
-        return std::ranges::any_of(_pairings, [&](const auto& pairing) {
-            return pairing.account == account && pairing.hash == hash;
-        });
+    bool removePairing(const std::string& account, const platform::Bytes& hash) {
+        return std::erase_if(_pairings, [&](const auto& pairing) {
+                   return pairing.account == account && pairing.hash == hash;
+               }) > 0;
     }
 
-    bool forget(const std::string& account, const platform::Bytes& hash) {
+    bool removeUnlockKey(const std::string& account, const platform::Bytes& hash) {
         return std::erase_if(_unlockKeys, [&](const auto& key) {
                    return key.account == account && key.hash == hash;
                }) > 0;
     }
-
-    bool remove(const std::string& account, const platform::Bytes& hash) {
-        return std::erase_if(_pairings, [&](const auto& pairing) {
-                   return pairing.account == account && pairing.hash == hash;
-               }) > 0;
+    bool isThere(const std::string& account, const platform::Bytes& hash) const {
+        return std::ranges::any_of(_pairings, [&](const auto& pairing) {
+            return pairing.account == account && pairing.hash == hash;
+        });
     }
 
     service::Outcome<std::vector<service::Pairing>> latestFirst(
