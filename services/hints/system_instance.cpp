@@ -105,6 +105,7 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     AdministratorRight right(polkit);
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
                           .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
+                          .unlockKeys = **pairings,
                           .callers = callers});
     CountedExchanges requests(service, idleness);
     BusServer server(connection, kHintsInterface, "Exchange", requests);

@@ -14,6 +14,8 @@
 #include "services/pam/exchange.h"
 #include "services/pam/options.h"
 #include "services/pam/pam_transaction.h"
+#include "platform/export.h"
+#include "settings/smartcard_configuration.h"
 #include "settings/smartcard_settings_worker.h"
 
 namespace {
@@ -62,26 +64,26 @@ int afterLogin(pam_handle_t* handle, int flags, int count, const char** words, S
 
 extern "C" {
 
-PAM_EXTERN int pam_sm_authenticate(pam_handle_t* handle, int flags, int count, const char** words) {
+VLM_EXPORT int pam_sm_authenticate(pam_handle_t* handle, int flags, int count, const char** words) {
     return guarded(handle, flags, count, words, [](Transaction& transaction, const Options& options) {
         return Authentication({transaction, exchangeOn(options.bus), options.patience, requiresCard})
             .run();
     });
 }
 
-PAM_EXTERN int pam_sm_setcred(pam_handle_t*, int, int, const char**) { return PAM_SUCCESS; }
+VLM_EXPORT int pam_sm_setcred(pam_handle_t*, int, int, const char**) { return PAM_SUCCESS; }
 
-PAM_EXTERN int pam_sm_acct_mgmt(pam_handle_t* handle, int flags, int count, const char** words) {
+VLM_EXPORT int pam_sm_acct_mgmt(pam_handle_t* handle, int flags, int count, const char** words) {
     return afterLogin(handle, flags, count, words, &AfterLogin::checkAccount);
 }
 
-PAM_EXTERN int pam_sm_open_session(pam_handle_t* handle, int flags, int count, const char** words) {
+VLM_EXPORT int pam_sm_open_session(pam_handle_t* handle, int flags, int count, const char** words) {
     return afterLogin(handle, flags, count, words, &AfterLogin::openSession);
 }
 
-PAM_EXTERN int pam_sm_close_session(pam_handle_t*, int, int, const char**) { return PAM_SUCCESS; }
+VLM_EXPORT int pam_sm_close_session(pam_handle_t*, int, int, const char**) { return PAM_SUCCESS; }
 
-PAM_EXTERN int pam_sm_chauthtok(pam_handle_t* handle, int flags, int count, const char** words) {
+VLM_EXPORT int pam_sm_chauthtok(pam_handle_t* handle, int flags, int count, const char** words) {
     // Whether the password may be changed is for others to say.
     if ((flags & PAM_PRELIM_CHECK) != 0) return PAM_SUCCESS;
     return afterLogin(handle, flags, count, words, &AfterLogin::changePassword);
