@@ -4,7 +4,7 @@
 // and lets nobody in.
 //
 // Threads: functions of their arguments. Errors: kinds of answers.
-// In tests: tests/unit/pam/login_requests_test.cpp
+// In tests: tests/unit/pam/authentication_test.cpp
 
 #pragma once
 

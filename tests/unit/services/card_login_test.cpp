@@ -56,7 +56,12 @@ protected:
         return why ? *why : "(it does not say)";
     }
 
-    CardKey wrapKey{"RSA-2048"};
+    // One for all tests, as it takes a while to make.
+    static const CardKey& theWrapKey() {
+        static const CardKey key("RSA-2048");
+        return key;
+    }
+    const CardKey& wrapKey = theWrapKey();
 };
 
 TEST_F(CardLoginTest, LogsInWithThePinAndGivesTheUnlockKey) {
