@@ -88,22 +88,21 @@ TEST(FrameAssemblerTest, PutsPiecesTogetherByteByByte) {
     const Bytes stream = {2, 0, 0, 0, 8, 9, 0, 0, 0, 0, 1};
 
     for (std::size_t i = 0; i < 5; ++i)
-        ASSERT_EQ(assembler.add(std::span(stream).subspan(i, 1)),
-                  FrameAssembler::State::Incomplete);
-    ASSERT_EQ(assembler.add(std::span(stream).subspan(5)), FrameAssembler::State::Complete);
+        ASSERT_EQ(assembler.add(std::span(stream).subspan(i, 1)), FrameState::Incomplete);
+    ASSERT_EQ(assembler.add(std::span(stream).subspan(5)), FrameState::Complete);
 
     EXPECT_EQ(assembler.take(), (Bytes{8, 9}));
-    EXPECT_EQ(assembler.add({}), FrameAssembler::State::Complete);
+    EXPECT_EQ(assembler.add({}), FrameState::Complete);
     EXPECT_EQ(assembler.take(), Bytes{});
-    EXPECT_EQ(assembler.add({}), FrameAssembler::State::Incomplete);
+    EXPECT_EQ(assembler.add({}), FrameState::Incomplete);
 }
 
 TEST(FrameAssemblerTest, RefusesAFrameThatIsTooLongAtItsHeader) {
     FrameAssembler assembler;
 
-    EXPECT_EQ(assembler.add(Bytes{0, 0, 0, 1}), FrameAssembler::State::Incomplete);
-    EXPECT_EQ(FrameAssembler().add(Bytes{1, 0, 0, 1}), FrameAssembler::State::TooLong);
-    EXPECT_EQ(FrameAssembler().add(Bytes{255, 255, 255, 255}), FrameAssembler::State::TooLong);
+    EXPECT_EQ(assembler.add(Bytes{0, 0, 0, 1}), FrameState::Incomplete);
+    EXPECT_EQ(FrameAssembler().add(Bytes{1, 0, 0, 1}), FrameState::TooLong);
+    EXPECT_EQ(FrameAssembler().add(Bytes{255, 255, 255, 255}), FrameState::TooLong);
 }
 
 }  // namespace
