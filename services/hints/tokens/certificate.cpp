@@ -2,10 +2,9 @@
 
 #include <openssl/core_names.h>
 
-#include <ctime>
-
 #include "services/hints/tokens/card_text.h"
 #include "services/hints/tokens/openssl_handles.h"
+#include "services/hints/tokens/openssl_time.h"
 #include "services/hints/tokens/signature.h"
 
 namespace vlm::service {
@@ -58,12 +57,6 @@ std::string nameOf(const X509* certificate) {
     if (!names) return {};
     if (std::string email = alternateName(names.get(), emailOf); !email.empty()) return email;
     return alternateName(names.get(), principalOf);
-}
-
-std::optional<std::int64_t> secondsOf(const ASN1_TIME* time) {
-    std::tm parts = {};
-    if (ASN1_TIME_to_tm(time, &parts) != 1) return {};
-    return timegm(&parts);
 }
 
 Bytes number(const EVP_PKEY* key, const char* name, std::size_t size) {

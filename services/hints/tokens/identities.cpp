@@ -103,6 +103,7 @@ void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token) 
         identity.notBefore = facts.notBefore;
         identity.notAfter = facts.notAfter;
         identity.canSign = facts.maySign && candidate.key.signs;
+        identity.certificate = candidate.certificate->der;
         token.identities.push_back(std::move(identity));
 
         // RSA goes before EC, and among keys of a kind the smallest hash, which comes first here.
@@ -113,6 +114,10 @@ void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token) 
             token.wrapKeyHash = hash;
         }
     }
+
+    for (const CertificateObject& certificate : objects.certificates)
+        if (!byHash.contains(certificate.facts.publicKeyHash))
+            token.otherCertificates.push_back(certificate.der);
 }
 
 }  // namespace vlm::service

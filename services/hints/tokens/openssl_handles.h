@@ -23,6 +23,7 @@ struct OpensslFree {
 };
 
 using X509Handle = std::unique_ptr<X509, OpensslFree<X509_free>>;
+using RevocationList = std::unique_ptr<X509_CRL, OpensslFree<X509_CRL_free>>;
 using PublicKeyHandle = std::unique_ptr<EVP_PKEY, OpensslFree<EVP_PKEY_free>>;
 using DigestContext = std::unique_ptr<EVP_MD_CTX, OpensslFree<EVP_MD_CTX_free>>;
 using BignumHandle = std::unique_ptr<BIGNUM, OpensslFree<BN_free>>;
