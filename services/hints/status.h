@@ -28,5 +28,6 @@ inline constexpr Status kUnreachable = -2014;   // the daemon does not answer th
 inline constexpr Status kBusy = -2015;          // too many requests wait for an answer already
 inline constexpr Status kUnattended = -2016;    // nobody can be asked in the caller's session
 inline constexpr Status kRightUnknown = -2017;  // whether an administrator allows it is not known
+inline constexpr Status kCertificateRefused = -2020;  // expired, not yet valid or not trusted
 
 }  // namespace vlm::service::status
