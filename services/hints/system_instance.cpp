@@ -9,18 +9,22 @@
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_server.h"
 #include "services/hints/caller_pin_prompt.h"
+#include "services/hints/certificate_trust.h"
 #include "services/hints/counted_work.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/hints_service.h"
 #include "services/hints/idleness.h"
 #include "services/hints/instances.h"
+#include "services/hints/judged_tokens.h"
 #include "services/hints/logind_caller_sessions.h"
 #include "services/hints/polkit_authority.h"
 #include "services/hints/prompter_registry.h"
 #include "services/hints/service_names.h"
 #include "services/hints/sqlite_pairing_store.h"
 #include "services/hints/tokens/signature.h"
+#include "services/hints/tokens/worker_anchors.h"
 #include "services/hints/tokens/worker_tokens.h"
+#include "settings/smartcard_settings_worker.h"
 
 namespace vlm::service {
 
@@ -36,6 +40,8 @@ std::int64_t secondsNow() {
     const auto since = std::chrono::system_clock::now().time_since_epoch();
     return std::chrono::duration_cast<std::chrono::seconds>(since).count();
 }
+
+bool isTrustChecked() { return resolveSetting("checkCertificateTrust").value != 0; }
 
 std::int64_t milliseconds() {
     const auto since = std::chrono::steady_clock::now().time_since_epoch();
@@ -97,8 +103,12 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     PrompterRegistry prompters(connection, callers, milliseconds);
     Proofs proofs(milliseconds);
     Idleness idleness(idlenessOf(loop.get(), options, proofs));
-    WorkerTokens cards(loop.get(), workersFor(options));
-    CountedTokens tokens(cards, idleness);
+    const auto workers = workersFor(options);
+    WorkerTokens cards(loop.get(), workers);
+    WorkerAnchors anchors(loop.get(), workers);
+    CertificateTrust trust;
+    JudgedTokens judged({cards, anchors, trust, isTrustChecked, secondsNow});
+    CountedTokens tokens(judged, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
     LogindCallerSessions sessions(connection);
     PolkitAuthority polkit(connection);

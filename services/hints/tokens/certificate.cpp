@@ -2,11 +2,10 @@
 
 #include <openssl/core_names.h>
 
-#include <ctime>
-
 #include "services/hints/tokens/card_text.h"
 #include "services/hints/tokens/key_strength.h"
 #include "services/hints/tokens/openssl_handles.h"
+#include "services/hints/tokens/openssl_time.h"
 #include "services/hints/tokens/signature.h"
 
 namespace vlm::service {
@@ -59,12 +58,6 @@ std::string nameOf(const X509* certificate) {
     if (!names) return {};
     if (std::string email = alternateName(names.get(), emailOf); !email.empty()) return email;
     return alternateName(names.get(), principalOf);
-}
-
-std::optional<std::int64_t> secondsOf(const ASN1_TIME* time) {
-    std::tm parts = {};
-    if (ASN1_TIME_to_tm(time, &parts) != 1) return {};
-    return timegm(&parts);
 }
 
 Bytes number(const EVP_PKEY* key, const char* name, std::size_t size) {

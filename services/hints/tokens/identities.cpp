@@ -132,9 +132,14 @@ void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token) 
         identity.notBefore = facts.notBefore;
         identity.notAfter = facts.notAfter;
         identity.canSign = facts.maySign && candidate.key.signs;
+        identity.certificate = candidate.certificate->der;
         token.identities.push_back(std::move(identity));
         offerWrapKey(candidate, objects.wrapMechanisms, token);
     }
+
+    for (const CertificateObject& certificate : objects.certificates)
+        if (!byHash.contains(certificate.facts.publicKeyHash))
+            token.otherCertificates.push_back(certificate.der);
 }
 
 }  // namespace vlm::service

@@ -20,6 +20,7 @@ struct CertificateObject {
     Bytes id;
     std::string label;  // harmless already
     CertificateFacts facts;
+    Bytes der;
 };
 
 struct KeyObject {
@@ -49,7 +50,8 @@ struct TokenObjects {
 enum class SameKey { Yes, No, Untold };
 SameKey sameKey(const KeyObject& key, const CertificateFacts& certificate);
 
-// Fills in the token's identities and its wrap key, as they are at the given time.
+// Fills in the token's identities, its wrap key and its other certificates, as they are at the
+// given time.
 void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token);
 
 }  // namespace vlm::service

@@ -29,6 +29,7 @@ using KeyContext = std::unique_ptr<EVP_PKEY_CTX, OpensslFree<EVP_PKEY_CTX_free>>
 using CipherContext = std::unique_ptr<EVP_CIPHER_CTX, OpensslFree<EVP_CIPHER_CTX_free>>;
 using KdfHandle = std::unique_ptr<EVP_KDF, OpensslFree<EVP_KDF_free>>;
 using KdfContext = std::unique_ptr<EVP_KDF_CTX, OpensslFree<EVP_KDF_CTX_free>>;
+using RevocationList = std::unique_ptr<X509_CRL, OpensslFree<X509_CRL_free>>;
 using DigestContext = std::unique_ptr<EVP_MD_CTX, OpensslFree<EVP_MD_CTX_free>>;
 using BignumHandle = std::unique_ptr<BIGNUM, OpensslFree<BN_free>>;
 using EcdsaSignature = std::unique_ptr<ECDSA_SIG, OpensslFree<ECDSA_SIG_free>>;

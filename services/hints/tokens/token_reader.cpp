@@ -9,12 +9,13 @@ std::optional<CertificateObject> readCertificateObject(const Pkcs11Session& sess
                                                        CK_OBJECT_HANDLE object) {
     const Attributes attributes =
         session.read(object, {CKA_CERTIFICATE_TYPE, CKA_VALUE, CKA_ID, CKA_LABEL});
-    const auto der = attributes.bytes(CKA_VALUE);
+    auto der = attributes.bytes(CKA_VALUE);
     if (!der || attributes.number(CKA_CERTIFICATE_TYPE) != CK_ULONG{CKC_X_509}) return {};
     auto facts = readCertificate(*der);
     if (!facts) return {};
     return CertificateObject{attributes.bytes(CKA_ID).value_or(Bytes{}),
-                             cardText(attributes.text(CKA_LABEL)), std::move(*facts)};
+                             cardText(attributes.text(CKA_LABEL)), std::move(*facts),
+                             std::move(*der)};
 }
 
 bool readKeys(const Pkcs11Session& session, CK_OBJECT_CLASS objectClass, TokenObjects& objects) {

@@ -2,6 +2,10 @@
 // socket as descriptor 3; it serves that until the other side closes it.
 //
 //   vlm-token-worker LOOK-AGAIN-MILLISECONDS MODULE-PATH
+//   vlm-token-worker anchors MODULE-PATH
+//
+// In the second form the module is one that holds trust anchors: these are told, without a
+// question, and that is all.
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -12,6 +16,7 @@
 #include <string>
 
 #include "services/hints/closed_process.h"
+#include "services/hints/tokens/anchor_reader.h"
 #include "services/hints/tokens/card_module.h"
 #include "services/hints/tokens/frames.h"
 #include "services/hints/tokens/worker_protocol.h"
@@ -83,19 +88,32 @@ private:
     std::optional<std::vector<Token>> _told;  // what the other side knows
 };
 
-int run(int argc, char* argv[]) {
-    int milliseconds = 0;
-    const std::string_view number = argc == 3 ? argv[1] : "";
-    const char* end = number.data() + number.size();
+bool hasSocket() {
     struct stat status = {};
-    if (number.empty() || std::from_chars(number.data(), end, milliseconds).ptr != end ||
-        fstat(kSocket, &status) != 0 || !S_ISSOCK(status.st_mode)) {
+    return fstat(kSocket, &status) == 0 && S_ISSOCK(status.st_mode);
+}
+
+// False when the words are none that this program is started with.
+bool serve(std::string_view word, const std::string& modulePath) {
+    if (word == "anchors") {
+        if (const auto anchors = readAnchors(modulePath)) {
+            if (const auto message = encodeAnchors(*anchors)) writeFrame(kSocket, *message);
+        }
+        return true;
+    }
+    int milliseconds = 0;
+    const char* end = word.data() + word.size();
+    if (word.empty() || std::from_chars(word.data(), end, milliseconds).ptr != end) return false;
+    Worker(modulePath, std::chrono::milliseconds(milliseconds)).serve();
+    return true;
+}
+
+int run(int argc, char* argv[]) {
+    closeToOthers();
+    if (argc != 3 || !hasSocket() || !serve(argv[1], argv[2])) {
         std::cerr << "vlm-token-worker: it is started by the hints service, not by hand\n";
         return 2;
     }
-    closeToOthers();
-    Worker worker(argv[2], std::chrono::milliseconds(milliseconds));
-    worker.serve();
     // Nobody waits any more; a module that does not come to an end is cut short.
     alarm(kSecondsToLeave);
     return 0;

@@ -32,12 +32,22 @@ std::optional<Bytes> write(Dictionary message) {
     return platform::writeBinaryPropertyList(std::move(message), kLimits);
 }
 
-PropertyList encode(const Identity& identity) {
-    return Dictionary{{"key", identity.publicKeyInfo},
-                      {"name", identity.name},
-                      {"from", identity.notBefore},
-                      {"until", identity.notAfter},
-                      {"signs", identity.canSign}};
+enum class Certificates { Told, LeftOut };
+
+bool isTold(const Bytes& certificate, Certificates certificates) {
+    return certificates == Certificates::Told && !certificate.empty() &&
+           certificate.size() <= kMostCertificateBytes;
+}
+
+PropertyList encode(const Identity& identity, Certificates certificates) {
+    Dictionary dictionary{{"key", identity.publicKeyInfo},
+                          {"name", identity.name},
+                          {"from", identity.notBefore},
+                          {"until", identity.notAfter},
+                          {"signs", identity.canSign}};
+    if (isTold(identity.certificate, certificates))
+        dictionary.set("certificate", identity.certificate);
+    return dictionary;
 }
 
 std::optional<Identity> decodeIdentity(const PropertyList& value) {
@@ -50,21 +60,29 @@ std::optional<Identity> decodeIdentity(const PropertyList& value) {
     identity.notBefore = entries.integer("from");
     identity.notAfter = entries.integer("until");
     identity.canSign = entries.boolean("signs");
+    if (entries.has("certificate"))
+        identity.certificate = entries.bytes("certificate", 1, kMostCertificateBytes);
     if (entries.failed()) return {};
     return identity;
 }
 
 PropertyList encode(WrapScheme scheme) { return static_cast<std::int64_t>(scheme); }
 
-PropertyList encode(const Token& token) {
+PropertyList encode(const Token& token, Certificates certificates) {
     Array identities;
-    for (const Identity& identity : token.identities) identities.push_back(encode(identity));
+    for (const Identity& identity : token.identities)
+        identities.push_back(encode(identity, certificates));
+    Array others;
+    for (const Bytes& other : token.otherCertificates)
+        if (isTold(other, certificates) && others.size() < kMostOtherCertificates)
+            others.emplace_back(other);
     Dictionary dictionary{{"id", token.identifier},
                           {"name", token.name},
                           {"pad", token.hasPinPad},
                           {"login", token.needsLogin},
                           {"pin", static_cast<std::int64_t>(token.pinState)},
                           {"identities", std::move(identities)}};
+    if (!others.empty()) dictionary.set("others", std::move(others));
     if (token.wrapKeyHash) {
         dictionary.set("wrap", *token.wrapKeyHash);
         dictionary.set("scheme", encode(token.wrapScheme));
@@ -94,6 +112,12 @@ std::optional<Token> decodeToken(const PropertyList& value) {
         auto identity = decodeIdentity(each);
         if (!identity) return {};
         token.identities.push_back(std::move(*identity));
+    }
+    if (entries.has("others")) {
+        for (const PropertyList& each : entries.array("others", kMostOtherCertificates)) {
+            if (each.bytes() == nullptr || each.bytes()->size() > kMostCertificateBytes) return {};
+            token.otherCertificates.push_back(*each.bytes());
+        }
     }
     if (entries.failed() || !isIdentifier(token.identifier)) return {};
     std::ranges::sort(token.identities, {}, &Identity::publicKeyHash);
@@ -178,17 +202,26 @@ std::optional<std::variant<ListRequest, ProofRequest>> decodeRequest(
     return request;
 }
 
-std::optional<Bytes> encodeAnswer(const ListAnswer& answer) {
+namespace {
+
+std::optional<Bytes> encodeWith(const ListAnswer& answer, Certificates certificates) {
     Array problems;
     for (const std::string& problem : answer.problems)
         if (problems.size() < kMostProblems) problems.emplace_back(problem);
     Dictionary message{{"problems", std::move(problems)}, {"silent", answer.announcesNothing}};
     if (answer.tokens) {
         Array tokens;
-        for (const Token& token : *answer.tokens) tokens.push_back(encode(token));
+        for (const Token& token : *answer.tokens) tokens.push_back(encode(token, certificates));
         message.set("tokens", std::move(tokens));
     }
     return write(std::move(message));
+}
+
+}  // namespace
+
+std::optional<Bytes> encodeAnswer(const ListAnswer& answer) {
+    auto whole = encodeWith(answer, Certificates::Told);
+    return whole ? std::move(whole) : encodeWith(answer, Certificates::LeftOut);
 }
 
 std::optional<Bytes> encodeAnswer(const Proof& answer) {

@@ -26,6 +26,8 @@ inline constexpr std::size_t kMostPinBytes = 256;
 inline constexpr std::size_t kMostChallengeBytes = 4096;
 inline constexpr std::size_t kMostSealedBytes = 8192;
 inline constexpr std::size_t kMostOpenedBytes = 4096;
+inline constexpr std::size_t kMostCertificateBytes = std::size_t{16} << 10U;
+inline constexpr std::size_t kMostOtherCertificates = 32;  // on one token
 
 struct ListRequest {};
 
@@ -49,6 +51,8 @@ struct FailedAnswer {
     std::string reason;  // why the module is of no use
 };
 
+// Certificates that are out of bounds are left out, and all of them where a listing would be too
+// long with them.
 std::optional<Bytes> encodeAnswer(const ListAnswer& answer);
 std::optional<Bytes> encodeAnswer(const Proof& answer);
 std::optional<Bytes> encodeAnswer(const OpeningAnswer& answer);

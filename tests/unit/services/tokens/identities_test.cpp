@@ -22,6 +22,7 @@ CertificateObject certificate(const std::string& name, std::uint8_t keyNumber,
     object.facts.notBefore = kNow - 100;
     object.facts.notAfter = kNow + 100;
     object.facts.maySign = object.facts.mayWrap = true;
+    object.der = {keyNumber, 99};
     return object;
 }
 
@@ -76,6 +77,16 @@ TEST_F(AddIdentitiesTest, SortsByHashWhateverTheModulesOrder) {
         showWithKey(certificate(std::to_string(number), number));
 
     EXPECT_THAT(names(), ElementsAre("1", "2", "3"));
+}
+
+TEST_F(AddIdentitiesTest, TellsTheCertificatesWithAndWithoutAKey) {
+    showWithKey(certificate("with", 1));
+    show(certificate("without", 2));
+
+    const auto token = made();
+
+    EXPECT_EQ(token.identities.at(0).certificate, (Bytes{1, 99}));
+    EXPECT_THAT(token.otherCertificates, ElementsAre(Bytes{2, 99}));
 }
 
 TEST_F(AddIdentitiesTest, NeedsAWitnessWhereTheTokenShowsKeys) {

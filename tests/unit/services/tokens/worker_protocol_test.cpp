@@ -22,6 +22,7 @@ Identity sampleIdentity(std::uint8_t number) {
     identity.notBefore = -1;
     identity.notAfter = std::int64_t{1} << 40;
     identity.canSign = true;
+    identity.certificate = Bytes(300, number);
     return identity;
 }
 
@@ -35,6 +36,7 @@ Token sampleToken() {
     if (token.identities[1].publicKeyHash < token.identities[0].publicKeyHash)
         std::swap(token.identities[0], token.identities[1]);
     token.wrapKeyHash = token.identities[0].publicKeyHash;
+    token.otherCertificates = {Bytes(200, 7), Bytes(100, 8)};
     return token;
 }
 
@@ -60,6 +62,34 @@ TEST(WorkerProtocolTest, CarriesTokens) {
     EXPECT_EQ(answer->tokens, tokens);
     EXPECT_EQ(answer->problems, std::vector<std::string>{"one problem"});
     EXPECT_TRUE(answer->announcesNothing);
+}
+
+TEST(WorkerProtocolTest, LeavesOutCertificatesThatAreOutOfBounds) {
+    Token token = sampleToken();
+    token.identities[0].certificate.resize(kMostCertificateBytes + 1);
+    token.otherCertificates = {Bytes(kMostCertificateBytes + 1)};
+    token.otherCertificates.resize(kMostOtherCertificates + 2, Bytes{1});
+
+    const auto answer = roundTrip(ListAnswer{std::vector{token}, {}});
+
+    ASSERT_TRUE(answer && answer->tokens);
+    const Token& told = answer->tokens->at(0);
+    EXPECT_EQ(told.identities[0].certificate, Bytes{});
+    EXPECT_EQ(told.identities[1].certificate, token.identities[1].certificate);
+    EXPECT_EQ(told.otherCertificates, std::vector<Bytes>(kMostOtherCertificates, Bytes{1}));
+}
+
+TEST(WorkerProtocolTest, TellsTokensWithoutCertificatesWhereThereIsNoRoomForThem) {
+    Token token = sampleToken();
+    token.otherCertificates.assign(kMostOtherCertificates, Bytes(kMostCertificateBytes));
+    std::vector<Token> tokens(40, token);
+
+    const auto answer = roundTrip(ListAnswer{tokens, {}});
+
+    ASSERT_TRUE(answer && answer->tokens);
+    EXPECT_EQ(answer->tokens->size(), 40U);
+    EXPECT_EQ(answer->tokens->at(0).identities[0].certificate, Bytes{});
+    EXPECT_EQ(answer->tokens->at(0).otherCertificates, std::vector<Bytes>{});
 }
 
 TEST(WorkerProtocolTest, TellsNoTokensFromUnchangedOnes) {
@@ -167,6 +197,9 @@ TEST(WorkerProtocolTest, RefusesTokensThatAreOutOfBounds) {
         {"identities of a wrong type", "identities", Dictionary{}},
         {"too many identities", "identities", Array(4097, identityEntries())},
         {"identity that is none", "identities", Array{5}},
+        {"too many certificates", "others", Array(33, Bytes{1})},
+        {"certificate that is too long", "others", Array{Bytes((16 << 10) + 1)}},
+        {"certificate of a wrong type", "others", Array{"text"}},
     };
     for (const HostileCase& each : cases) {
         Dictionary token = tokenEntries();
@@ -185,6 +218,8 @@ TEST(WorkerProtocolTest, RefusesIdentitiesThatAreOutOfBounds) {
         {"date of a wrong type", "from", "now"},
         {"date out of range", "until", ~std::uint64_t{0}},
         {"ability of a wrong type", "signs", "yes"},
+        {"certificate that is too long", "certificate", Bytes((16 << 10) + 1)},
+        {"certificate of a wrong type", "certificate", "text"},
     };
     for (const HostileCase& each : cases) {
         Dictionary identity = identityEntries();
