@@ -8,6 +8,7 @@
 #include "platform/harmless_text.h"
 #include "platform/platform.h"
 #include "platform/text.h"
+#include "services/hints/certificate_trust.h"
 #include "services/hints/status.h"
 #include "settings/smartcard_settings_worker.h"
 
@@ -122,21 +123,13 @@ Outcome<LoginCard> LoginPolicy::choose(const std::vector<Candidate>& candidates,
 }
 
 std::optional<Refusal> LoginPolicy::whyNotAccepted(const Candidate& candidate) const {
-    const auto refused = [&](platform::Status status, std::string_view why) {
-        return Refusal{status, platform::text("Logging in with \"{}\" of the card \"{}\": {}",
-                                              candidate.identity->name, candidate.token->name, why)};
-    };
-    const auto now = _parts.now();
-    if (candidate.identity->notAfter < now)
-        return refused(status::kCertificateRefused,
-                       "its certificate has expired. Ask who issued the card for a new one.");
-    if (candidate.identity->notBefore > now)
-        return refused(status::kCertificateRefused,
-                       "its certificate is not valid yet. Look whether the clock is right.");
-    if (candidate.token->pinState == PinState::Locked)
-        return refused(status::kPinLocked,
-                       "the card's PIN is locked. Unlock it with the PUK, or ask who issued it.");
-    return std::nullopt;
+    if (auto refusal = whyNotTrusted(*candidate.identity, _parts.now())) return refusal;
+    if (candidate.token->pinState != PinState::Locked) return std::nullopt;
+    return Refusal{
+        status::kPinLocked,
+        platform::text("Logging in with \"{}\" of the card \"{}\": the card's PIN is locked. Unlock "
+                       "it with the PUK, or ask who issued it.",
+                       candidate.identity->name, candidate.token->name)};
 }
 
 Refusal LoginPolicy::noCard(const std::optional<std::string>& account) const {

@@ -56,11 +56,11 @@ void WorkerAnchors::receive(Reading& reading) {
     if (size < 0 && (errno == EAGAIN || errno == EINTR)) return;
     if (size <= 0) return end(reading, std::nullopt);
     switch (reading.incoming.add(std::span(piece).first(static_cast<std::size_t>(size)))) {
-        case FrameAssembler::State::Incomplete:
+        case FrameState::Incomplete:
             return;
-        case FrameAssembler::State::TooLong:
+        case FrameState::TooLong:
             return end(reading, std::nullopt);
-        case FrameAssembler::State::Complete:
+        case FrameState::Complete:
             return end(reading, decodeAnchors(reading.incoming.take()));
     }
 }

@@ -89,18 +89,28 @@ TEST_F(LoginPolicyTest, SaysWhyTheOnlyCardIsNotAccepted) {
 
     const auto old = policy.cardOf("alice", {card("a", {expired(1)})});
     EXPECT_EQ(chosen(old), "refused -2020");
-    EXPECT_THAT(old.refusal().text, HasSubstr("\"Old\" of the card \"a\": its certificate has "
-                                              "expired"));
+    EXPECT_THAT(old.refusal().text, HasSubstr("\"Old\" is not good for a login: it has expired"));
 
     now = kNow - 11;
     const auto early = policy.cardOf("alice", {card("a", {identityOf(1, "A")})});
     EXPECT_EQ(chosen(early), "refused -2020");
-    EXPECT_THAT(early.refusal().text, HasSubstr("not valid yet"));
+    EXPECT_THAT(early.refusal().text, HasSubstr("not yet valid"));
 
     now = kNow;
     auto locked = card("a", {identityOf(1, "A")});
     locked.pinState = PinState::Locked;
     EXPECT_EQ(cardOf("alice", {locked}), "refused -2009");
+}
+
+TEST_F(LoginPolicyTest, TakesNoCertificateThatTheMachineDistrusts) {
+    pair("alice", 1);
+    auto revoked = identityOf(1, "A");
+    revoked.distrust = "it was revoked";
+
+    const auto card = policy.cardOf("alice", {this->card("a", {revoked})});
+    EXPECT_EQ(chosen(card), "refused -2020");
+    EXPECT_THAT(card.refusal().text, HasSubstr("it was revoked"));
+    EXPECT_EQ(cardOfAnybody({this->card("a", {revoked})}), "refused -2018");
 }
 
 TEST_F(LoginPolicyTest, TakesACertificateFromItsFirstToItsLastSecond) {
