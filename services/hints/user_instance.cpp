@@ -6,10 +6,13 @@
 #include "services/hints/forwarding_service.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/instances.h"
+#include "services/hints/logind_user_sessions.h"
 #include "services/hints/pin_asking.h"
 #include "services/hints/prompter_registration.h"
+#include "services/hints/removal_action.h"
 #include "services/hints/service_names.h"
 #include "services/hints/session_tokens.h"
+#include "settings/smartcard_settings_worker.h"
 
 namespace vlm::service {
 
@@ -35,6 +38,8 @@ private:
     PrompterRegistration _registration;
 };
 
+std::int32_t removalSetting() { return resolveSetting("tokenRemovalAction").value; }
+
 }  // namespace
 
 InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
@@ -47,14 +52,18 @@ InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
     BusDaemonLink daemon(loop.get());
     ForwardingService service(daemon, callers);
     BusServer server(connection, kHintsInterface, "Exchange", service);
-    SessionTokens tokens({loop.get(), connection, callers, daemon});
-    if (!server.start() || !tokens.start()) return {"the bus does not take the service"};
-
     // Without a system bus there is no daemon that could ask; requests say so themselves.
     const auto systemBus =
         BusConnection::open(loop.get(), BusKind::System, [](const std::string& reason) {
             kLog.error("the daemon can no longer ask for PINs here: {}", reason);
         });
+    const SessionCards cards;
+    LogindUserSessions sessions(systemBus ? (*systemBus)->get() : nullptr);
+    RemovalAction removal({cards, sessions, removalSetting});
+    SessionTokens tokens({loop.get(), connection, callers, daemon,
+                          [&](const std::string& token) { removal.cardRemoved(token); }});
+    if (!server.start() || !tokens.start()) return {"the bus does not take the service"};
+
     std::optional<DesktopPrompter> prompter;
     if (systemBus) prompter.emplace(loop.get(), (*systemBus)->get(), options.pinentry);
     if (!prompter || !prompter->start())
