@@ -72,6 +72,7 @@ void HintsService::serve(const Caller& caller, Request request, const Answer& an
         case Operation::CardLogin:
             return logInWithCard(caller, std::move(request), answer);
         case Operation::SessionLogin:
+            return answer(noteSessionLogin(request));
         case Operation::UnlockKeybag:
         case Operation::TokenEndpoints:
             return answer(refused(status::kNotServed, request, "this service does not do that."));
@@ -191,6 +192,11 @@ Outcome<Message> HintsService::isPaired(const Request& request) {
         _parts.changes.pairings.isPaired(spelling(request.account).value_or(request.account));
     if (!answer) return answer.refusal();
     return numberReply(*answer ? 1 : 0);
+}
+
+Outcome<Message> HintsService::noteSessionLogin(const Request& request) {
+    if (const auto refusal = _parts.sessionLogin.note(request)) return *refusal;
+    return numberReply(status::kSuccess);
 }
 
 }  // namespace vlm::service

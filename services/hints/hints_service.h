@@ -20,6 +20,7 @@
 #include "services/hints/login.h"
 #include "services/hints/login_policy.h"
 #include "services/hints/pairing_change.h"
+#include "services/hints/session_login.h"
 #include "services/hints/token_info.h"
 #include "services/hints/unlock_key_store.h"
 
@@ -31,6 +32,7 @@ public:
         LoginParts login;
         PairingChangeParts changes;
         UnlockKeyStore& unlockKeys;
+        SessionLogin sessionLogin;
         CallerWatch& callers;
     };
 
@@ -58,6 +60,7 @@ private:
     void changePairing(const Caller& caller, Request request, const Answer& answer);
     void listPairings(const Request& request, const Answer& answer);
     Outcome<platform::Message> isPaired(const Request& request);
+    Outcome<platform::Message> noteSessionLogin(const Request& request);
 
     // The number of what begins for the caller; none when the caller has left.
     std::optional<std::uint64_t> begin(const Caller& caller);

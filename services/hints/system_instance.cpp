@@ -1,5 +1,6 @@
 #include <sys/random.h>
 #include <systemd/sd-daemon.h>
+#include <systemd/sd-login.h>
 
 #include <chrono>
 #include <filesystem>
@@ -42,6 +43,11 @@ std::int64_t secondsNow() {
 }
 
 bool isTrustChecked() { return resolveSetting("checkCertificateTrust").value != 0; }
+
+bool isSession(const std::string& name) {
+    uid_t user = 0;
+    return sd_session_get_uid(name.c_str(), &user) >= 0;
+}
 
 std::int64_t milliseconds() {
     const auto since = std::chrono::steady_clock::now().time_since_epoch();
@@ -113,9 +119,11 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     LogindCallerSessions sessions(connection);
     PolkitAuthority polkit(connection);
     AdministratorRight right(polkit);
+    const SessionCards sessionCards;
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
                           .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
                           .unlockKeys = **pairings,
+                          .sessionLogin = {sessionCards, isSession},
                           .callers = callers});
     CountedExchanges requests(service, idleness);
     BusServer server(connection, kHintsInterface, "Exchange", requests);

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -19,6 +20,7 @@
 #include "platform_test.h"
 #include "services/hints/hints_service.h"
 #include "services/hints/status.h"
+#include "tests/integration/linux/temporary_folder.h"
 
 namespace vlm::service {
 
@@ -95,6 +97,11 @@ protected:
     fakes::FakeAuthority authority;
     Proofs proofs{[this] { return now; }};
     AdministratorRight right{authority};
+    test::TemporaryFolder folder;
+    SessionCards sessionCards{folder.path() / "vlm" / "sessions"};
+    std::set<std::string> openSessions;
+    SessionLogin sessionLogin{sessionCards,
+                              [this](const auto& name) { return openSessions.contains(name); }};
     std::uint8_t lastRandom = 0;
     HintsService service{{
         .login = {
@@ -105,6 +112,7 @@ protected:
             [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
         .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
         .unlockKeys = pairings,
+        .sessionLogin = sessionLogin,
         .callers = callers,
     }};
 

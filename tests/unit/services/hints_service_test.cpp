@@ -325,6 +325,7 @@ TEST_F(HintsServiceTest, LetsGoOfAnswersThatComeAfterItIsGone) {
             {.login = {cards, prompt, {}, {}},
              .changes = {cards, pairings, proofs, sessions, right, [] { return kNow; }},
              .unlockKeys = pairings,
+             .sessionLogin = sessionLogin,
              .callers = callers}};
         const auto count = [&](const platform::Message&) { ++replies; };
         shortLived.handle(root(), requestOf(1, {{"uid", signedNumber(-1)}}), count);

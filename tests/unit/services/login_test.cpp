@@ -288,6 +288,7 @@ TEST_F(LoginTest, GivesTheCardNoPinWhenThereIsNothingToChallengeItWith) {
     HintsService poor{{.login = {cards, prompt, {}, [](std::size_t) { return std::nullopt; }},
                        .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
                        .unlockKeys = pairings,
+                       .sessionLogin = sessionLogin,
                        .callers = callers}};
     platform::Message reply;
 
