@@ -4,7 +4,7 @@
 // answered is wiped here and given back to it, whatever becomes of it.
 //
 // Threads: the application's. Errors: PAM's return values.
-// In tests: tests/unit/pam/conversation_test.cpp, fuzz/pam_conversation_fuzzer.cpp
+// In tests: tests/unit/pam/conversation_test.cpp, fuzz/pam_properties.h
 
 #pragma once
 

@@ -27,6 +27,7 @@ def a_card_and_its_pin_log_in_on_a_terminal(lab):
     pair(lab, "alice", ALICE, "rsa")
 
     terminal = Terminal(lab, "login")
+    terminal.answer(NAME_PROMPT, "alice")
     terminal.answer(PIN_PROMPT, "123456")
     shell = lab.wait_until("a shell is there", lambda: _shells(lab, "alice"))
     check.assertTrue(shell)
@@ -40,6 +41,7 @@ def the_session_that_a_card_has_opened_is_known(lab):
     pair(lab, "alice", ALICE, "rsa")
 
     terminal = Terminal(lab, "login")
+    terminal.answer(NAME_PROMPT, "alice")
     terminal.answer(PIN_PROMPT, "123456")
     lab.wait_until("a shell is there", lambda: _shells(lab, "alice"))
     terminal.type("cat /run/vlm/sessions/$XDG_SESSION_ID; exit")
@@ -154,6 +156,7 @@ def a_card_that_is_pulled_after_the_login_leaves_it_good(lab):
     turn_on(lab)
     pair(lab, "alice", ALICE, "rsa")
     terminal = Terminal(lab, "login")
+    terminal.answer(NAME_PROMPT, "alice")
     terminal.answer(PIN_PROMPT, "123456")
     lab.wait_until("a shell is there", lambda: _shells(lab, "alice"))
 
