@@ -2,6 +2,7 @@
 //
 //   pkcs1-only   RSA with the old padding, and nothing else
 //   oaep-only    OAEP with SHA-256, as the software module by itself does not
+//   all          this, and what the software module does
 //   nothing      neither RSA nor ECDH
 //   short        leaves the zero in front of an RSA block out
 //   refuses      offers everything and does nothing of it
@@ -46,7 +47,7 @@ static bool takesPaddingOff = false;
 static CK_RV decryptInit(CK_SESSION_HANDLE session, CK_MECHANISM* mechanism, CK_OBJECT_HANDLE key) {
     fail();
     if (isA("refuses") || hides(mechanism->mechanism)) return CKR_FUNCTION_FAILED;
-    takesPaddingOff = isA("oaep-only") && mechanism->mechanism == CKM_RSA_PKCS_OAEP;
+    takesPaddingOff = (isA("oaep-only") || isA("all")) && mechanism->mechanism == CKM_RSA_PKCS_OAEP;
     if (!takesPaddingOff) return realModule().C_DecryptInit(session, mechanism, key);
     const auto* parameters = static_cast<CK_RSA_PKCS_OAEP_PARAMS*>(mechanism->pParameter);
     if (parameters->hash_alg != CKM_SHA256 || parameters->mgf != CKG_MGF1_SHA256 ||
