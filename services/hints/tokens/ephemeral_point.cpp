@@ -6,6 +6,8 @@ namespace vlm::service {
 
 bool isPointForKey(std::span<const std::uint8_t> point,
                    std::span<const std::uint8_t> publicKeyInfo) {
+    constexpr std::uint8_t kUncompressed = 4;
+    if (point.empty() || point.front() != kUncompressed) return false;
     const QuietErrors quiet;
     const unsigned char* start = publicKeyInfo.data();
     const KeyHandle key(d2i_PUBKEY(nullptr, &start, static_cast<long>(publicKeyInfo.size())));
