@@ -124,7 +124,7 @@ std::unique_ptr<PinPrompt::Question> CallerPinPrompt::askHere(std::optional<Term
                                                               const PinQuestion& question,
                                                               Answer answer) {
     return Pinentry::start(_event, pinentryFor(question.caller, _namedPinentry),
-                           std::move(terminal), question, std::move(answer));
+                           std::move(terminal), pinForm(question), std::move(answer));
 }
 
 }  // namespace vlm::service
