@@ -20,6 +20,7 @@
 #include "services/hints/login.h"
 #include "services/hints/pairing_change.h"
 #include "services/hints/token_info.h"
+#include "services/hints/unlock_key_storing.h"
 
 namespace vlm::service {
 
@@ -28,6 +29,7 @@ public:
     struct Parts {
         LoginParts login;
         PairingChangeParts changes;
+        UnlockKeyParts unlockKeys;
         CallerWatch& callers;
     };
 
@@ -50,11 +52,15 @@ private:
                                               const std::vector<Token>& tokens);
     void changePairing(const Caller& caller, Request request, const Answer& answer);
     void listPairings(const Request& request, const Answer& answer);
+    void storeUnlockKey(const Caller& caller, Request request, const Answer& answer);
+    void nameKeyring(const Caller& caller, const Request& request, const Answer& answer);
+    void unlockKeyring(const Caller& caller, const Request& request, const Answer& answer);
+    Outcome<platform::Message> changeUnlockKeys(const Caller& caller, const Request& request);
     Outcome<platform::Message> isPaired(const Request& request);
 
     // The number of what begins for the caller; none when the caller has left.
     std::optional<std::uint64_t> begin(const Caller& caller);
-    void end(std::uint64_t number, const std::optional<Refusal>& refusal, const Answer& answer);
+    void end(std::uint64_t number, Outcome<platform::Message> outcome, const Answer& answer);
 
     Parts _parts;
     std::map<std::uint64_t, Running> _running;

@@ -18,6 +18,8 @@ bool concernsCaller(const Caller& caller, const Request& request) {
         case Operation::Unpair:
         case Operation::Pairings:
         case Operation::IsPaired:
+        case Operation::EraseUnlockKey:
+        case Operation::PasswordChanged:
             return platform::current().accounts().userId(request.account) == caller.user;
         default:
             return request.user == platform::kNobody || request.user == caller.user;

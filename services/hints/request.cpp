@@ -7,7 +7,9 @@
 #include "platform/harmless_text.h"
 #include "platform/property_list.h"
 #include "platform/text.h"
+#include "services/hints/secret_pipe.h"
 #include "services/hints/status.h"
+#include "services/keychain/unlock_key_wrapping.h"
 
 namespace vlm::service {
 
@@ -26,7 +28,7 @@ constexpr platform::PropertyListLimits kQueryLimits = {
 class Reader {
 public:
     explicit Reader(const IncomingRequest& incoming) : _incoming(incoming) {
-        for (const auto key : {"op", "uid", "dat1", "str1", "str2", "str3", "num1"})
+        for (const auto key : {"op", "uid", "dat1", "dat2", "str1", "str2", "str3", "num1"})
             if (std::ranges::find(incoming.unreadableKeys, key) != incoming.unreadableKeys.end())
                 refuse(platform::text("\"{}\" is there twice, or of a type that no key has", key));
     }
@@ -62,23 +64,36 @@ public:
     }
 
     const std::string* optionalText(std::string_view key, std::size_t most) {
+        const auto* value = anyText(key, most);
+        if (value && value->empty()) refuse(platform::text("\"{}\" is empty", key));
+        return value;
+    }
+
+    const std::string* anyText(std::string_view key, std::size_t most) {
         const auto* value = message().text(key);
         if (!value && isThere(key)) missing(key, "text");
-        if (!value) return nullptr;
-        if (value->empty()) refuse(platform::text("\"{}\" is empty", key));
-        if (value->size() > most)
+        if (value && value->size() > most)
             refuse(platform::text("\"{}\" has {} bytes, and {} is the most", key, value->size(),
                                   most));
         return value;
     }
 
-    platform::Bytes hash() {
-        const auto* value = message().bytes("dat1");
-        if (!value) return missing("dat1", "bytes"), platform::Bytes();
+    platform::Bytes hash(std::string_view key = "dat1") {
+        const auto* value = message().bytes(key);
+        if (!value) return missing(key, "bytes"), platform::Bytes();
         if (value->size() != kHashSize)
-            refuse(platform::text("\"dat1\" has {} bytes, and a public-key hash has {}",
+            refuse(platform::text("\"{}\" has {} bytes, and a public-key hash has {}", key,
                                   value->size(), kHashSize));
         return *value;
+    }
+
+    std::optional<Secret> passwordInPipe(std::string_view key) {
+        const auto pipe = message().endpoint(key);
+        if (!pipe) return missing(key, "a pipe"), std::nullopt;
+        auto password = secretIn(*pipe);
+        if (!password || password->text().size() > kMostUnlockKeyBytes)
+            refuse(platform::text("\"{}\" is no pipe that holds a password", key));
+        return password;
     }
 
     // The token that a query of the form {"tokid": token} is restricted to; empty for all tokens.
@@ -130,6 +145,15 @@ void readLogin(Reader& reader, Request& request) {
     request.user = reader.user();
 }
 
+void readStoring(Reader& reader, Request& request) {
+    request.user = reader.user();
+    request.hash = reader.hash();
+    request.wrapKeyHash = reader.hash("dat2");
+    request.tokenIdentifier = reader.text("str1", kMostTokenIdentifier);
+    request.keyring = reader.text("str2", kMostOtherText);
+    reader.anyText("str3", kMostOtherText);
+}
+
 void readArguments(Reader& reader, Request& request) {
     switch (request.operation) {
         case Operation::Login:
@@ -150,15 +174,45 @@ void readArguments(Reader& reader, Request& request) {
             return;
         case Operation::UnlockKeybag:
             request.user = reader.user();
-            reader.text("str1", kMostOtherText);
+            request.password = Secret(reader.text("str1", kMostUnlockKeyBytes));
             return;
         case Operation::IsPaired:
             request.account = reader.text("str1", kMostAccountName);
             return;
         case Operation::TokenEndpoints:
+        case Operation::NameKeyring:
             request.user = reader.user();
             return;
+        case Operation::StoreUnlockKey:
+            return readStoring(reader, request);
+        case Operation::EraseUnlockKey:
+            request.hash = reader.hash();
+            request.account = reader.text("str1", kMostAccountName);
+            return;
+        case Operation::PasswordChanged:
+            request.account = reader.text("str1", kMostAccountName);
+            request.password = reader.passwordInPipe("dat1");
+            return;
     }
+}
+
+bool isOperation(std::uint64_t code) {
+    switch (static_cast<Operation>(code)) {
+        case Operation::Login:
+        case Operation::TokenInfo:
+        case Operation::Pair:
+        case Operation::Unpair:
+        case Operation::Pairings:
+        case Operation::UnlockKeybag:
+        case Operation::IsPaired:
+        case Operation::TokenEndpoints:
+        case Operation::NameKeyring:
+        case Operation::StoreUnlockKey:
+        case Operation::EraseUnlockKey:
+        case Operation::PasswordChanged:
+            return true;
+    }
+    return false;
 }
 
 }  // namespace
@@ -166,8 +220,8 @@ void readArguments(Reader& reader, Request& request) {
 Outcome<Request> readRequest(const IncomingRequest& incoming) {
     Reader reader(incoming);
     const auto code = reader.number("op");
-    if (code > static_cast<std::uint64_t>(Operation::TokenEndpoints))
-        reader.refuse(platform::text("\"op\" is {}, and operations are 0 to 7", code));
+    if (!isOperation(code))
+        reader.refuse(platform::text("\"op\" is {}, which is no operation", code));
     if (reader.refusal()) return *reader.refusal();
 
     Request request;
@@ -193,11 +247,20 @@ std::string describe(const Request& request) {
         case Operation::Pairings:
             return platform::text("Listing the pairings of {}", account);
         case Operation::UnlockKeybag:
-            return "Unlocking a key bag";
+            return "Unlocking a login keyring";
         case Operation::IsPaired:
             return platform::text("Asking whether {} is paired", account);
         case Operation::TokenEndpoints:
             return "Watching for cards";
+        case Operation::NameKeyring:
+            return platform::text("Naming the login keyring of user {}", request.user);
+        case Operation::StoreUnlockKey:
+            return platform::text("Storing the key that opens the login keyring of user {} with {}",
+                                  request.user, hash);
+        case Operation::EraseUnlockKey:
+            return platform::text("Erasing the unlock key of {} for {}", account, hash);
+        case Operation::PasswordChanged:
+            return platform::text("Wrapping the new password of {}", account);
     }
     return {};
 }

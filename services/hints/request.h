@@ -29,17 +29,26 @@ enum class Operation : std::uint64_t {
     UnlockKeybag = 5,
     IsPaired = 6,
     TokenEndpoints = 7,
+    NameKeyring = 8,
+    StoreUnlockKey = 9,
+    EraseUnlockKey = 10,
+    PasswordChanged = 13,
 };
 
 struct Request {
     Operation operation = Operation::Login;
-    platform::UserId user = platform::kNobody;  // Login, TokenInfo, UnlockKeybag, TokenEndpoints
-    platform::Bytes hash;                       // Login, Pair, Unpair
-    std::string account;                        // Pair, Unpair, Pairings, IsPaired
-    std::string tokenIdentifier;                // Login; TokenInfo: empty for all tokens
-    std::optional<Secret> pin;                  // Login, when the caller has it
-    bool insertedOnly = false;                  // Pairings
-    bool asksWhenToLookAgain = false;           // TokenInfo
+    platform::UserId user = platform::kNobody;  // Login, TokenInfo, UnlockKeybag, TokenEndpoints,
+                                                // NameKeyring, StoreUnlockKey
+    platform::Bytes hash;              // Login, Pair, Unpair, StoreUnlockKey, EraseUnlockKey
+    std::string account;               // Pair, Unpair, Pairings, IsPaired, EraseUnlockKey,
+                                       // PasswordChanged
+    std::string tokenIdentifier;       // Login, StoreUnlockKey; TokenInfo: empty for all tokens
+    std::optional<Secret> pin;         // Login, when the caller has it
+    std::optional<Secret> password;    // UnlockKeybag, PasswordChanged: always there
+    platform::Bytes wrapKeyHash;       // StoreUnlockKey
+    std::string keyring;               // StoreUnlockKey
+    bool insertedOnly = false;         // Pairings
+    bool asksWhenToLookAgain = false;  // TokenInfo
 };
 
 Outcome<Request> readRequest(const IncomingRequest& incoming);

@@ -23,10 +23,13 @@ inline constexpr Status kPinLocked = -2009;
 inline constexpr Status kCardFailed = -2010;  // the card, its reader or its module failed
 inline constexpr Status kNotProved = -2011;   // no valid signature by the key was given
 inline constexpr Status kNotPaired = -2012;
-inline constexpr Status kStoreFailed = -2013;   // the pairings could not be read or written
-inline constexpr Status kUnreachable = -2014;   // the daemon does not answer the user's instance
-inline constexpr Status kBusy = -2015;          // too many requests wait for an answer already
-inline constexpr Status kUnattended = -2016;    // nobody can be asked in the caller's session
-inline constexpr Status kRightUnknown = -2017;  // whether an administrator allows it is not known
+inline constexpr Status kStoreFailed = -2013;     // the pairings could not be read or written
+inline constexpr Status kUnreachable = -2014;     // the daemon does not answer the user's instance
+inline constexpr Status kBusy = -2015;            // too many requests wait for an answer already
+inline constexpr Status kUnattended = -2016;      // nobody can be asked in the caller's session
+inline constexpr Status kRightUnknown = -2017;    // whether an administrator allows it is not known
+inline constexpr Status kNoKeyring = -2021;       // no login keyring, or nobody there to ask
+inline constexpr Status kKeyringRefused = -2022;  // the keyring did not take the password
+inline constexpr Status kNoWrapKey = -2023;       // the card has no key that can wrap
 
 }  // namespace vlm::service::status

@@ -8,6 +8,7 @@
 #include "services/hints/bus_caller_watch.h"
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_server.h"
+#include "services/hints/bus_user_keyrings.h"
 #include "services/hints/caller_pin_prompt.h"
 #include "services/hints/counted_work.h"
 #include "services/hints/hints_log.h"
@@ -72,13 +73,14 @@ Idleness::Parts idlenessOf(sd_event* event, const Options& options, const Proofs
 
 // Whoever asks from now on starts the service anew; what came before is still answered. A question
 // to a person would keep the new one waiting for as long as that person takes.
-void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, PolkitAuthority& polkit,
-           Idleness& idleness) {
+void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt,
+           BusUserKeyrings& keyrings, PolkitAuthority& polkit, Idleness& idleness) {
     kLog.info("leaving after a quiet time");
     // First, so that systemd neither ends this process for the loss of its name nor takes it for
     // the one that serves.
     sd_notify(0, "STOPPING=1");
     prompt.askNobody();
+    keyrings.askNobody();
     polkit.askNobody();
     bus.release([&] { idleness.callWhenDone([&] { loop.end(); }); });
 }
@@ -100,18 +102,20 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     WorkerTokens cards(loop.get(), workersFor(options));
     CountedTokens tokens(cards, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
+    BusUserKeyrings keyrings(loop.get(), prompters, {});
     LogindCallerSessions sessions(connection);
     PolkitAuthority polkit(connection);
     AdministratorRight right(polkit);
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
                           .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
+                          .unlockKeys = {tokens, **pairings, **pairings, keyrings},
                           .callers = callers});
     CountedExchanges requests(service, idleness);
-    BusServer server(connection, kHintsInterface, "Exchange", requests);
+    BusServer server(connection, kHintsInterface, {{"Exchange", requests}});
 
     if (!server.start() || !prompters.start()) return {"the bus does not take the service"};
     if (auto reason = (*bus)->claim(kDaemonName); !reason.empty()) return {reason};
-    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, polkit, idleness); });
+    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, keyrings, polkit, idleness); });
     return {{}, loop.run()};
 }
 

@@ -2,14 +2,17 @@
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_daemon_link.h"
 #include "services/hints/bus_server.h"
+#include "services/hints/desktop_password_prompt.h"
 #include "services/hints/desktop_pin_prompt.h"
 #include "services/hints/forwarding_service.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/instances.h"
+#include "services/hints/keyring_errands.h"
 #include "services/hints/pin_asking.h"
 #include "services/hints/prompter_registration.h"
 #include "services/hints/service_names.h"
 #include "services/hints/session_tokens.h"
+#include "services/keychain/secret_service_keyring.h"
 
 namespace vlm::service {
 
@@ -18,19 +21,32 @@ namespace {
 // What this instance does for the daemon, on the system bus.
 class DesktopPrompter {
 public:
-    DesktopPrompter(sd_event* event, sd_bus* systemBus, const std::string& pinentry)
-        : _prompt(event, pinentry),
+    DesktopPrompter(sd_event* event, sd_bus* systemBus, const std::string& pinentry,
+                    LoginKeyring& keyring)
+        : _pins(event, pinentry),
+          _passwords(event, pinentry),
           _callers(systemBus),
-          _asking(_prompt, _callers),
-          _server(systemBus, kPrompterInterface, "AskPin", _asking),
+          _pinAsking(_pins, _callers),
+          _naming(keyring, _callers),
+          _passwordAsking(_passwords, keyring, _callers),
+          _opening(keyring, _callers),
+          _server(systemBus, kPrompterInterface,
+                  {{"AskPin", _pinAsking},
+                   {"NameKeyring", _naming},
+                   {"AskKeyringPassword", _passwordAsking},
+                   {"UnlockKeyring", _opening}}),
           _registration(systemBus) {}
 
     bool start() { return _server.start() && _registration.start(); }
 
 private:
-    DesktopPinPrompt _prompt;
+    DesktopPinPrompt _pins;
+    DesktopPasswordPrompt _passwords;
     BusCallerWatch _callers;
-    PinAsking _asking;
+    PinAsking _pinAsking;
+    KeyringNaming _naming;
+    KeyringPasswordAsking _passwordAsking;
+    KeyringOpening _opening;
     BusServer _server;
     PrompterRegistration _registration;
 };
@@ -45,8 +61,9 @@ InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
 
     BusCallerWatch callers(connection);
     BusDaemonLink daemon(loop.get());
-    ForwardingService service(daemon, callers);
-    BusServer server(connection, kHintsInterface, "Exchange", service);
+    SecretServiceKeyring keyring(loop.get(), connection, runtimeFolder());
+    ForwardingService service(daemon, keyring, callers);
+    BusServer server(connection, kHintsInterface, {{"Exchange", service}});
     SessionTokens tokens({loop.get(), connection, callers, daemon});
     if (!server.start() || !tokens.start()) return {"the bus does not take the service"};
 
@@ -56,7 +73,7 @@ InstanceEnd runUserInstance(ServiceLoop& loop, const Options& options) {
             kLog.error("the daemon can no longer ask for PINs here: {}", reason);
         });
     std::optional<DesktopPrompter> prompter;
-    if (systemBus) prompter.emplace(loop.get(), (*systemBus)->get(), options.pinentry);
+    if (systemBus) prompter.emplace(loop.get(), (*systemBus)->get(), options.pinentry, keyring);
     if (!prompter || !prompter->start())
         kLog.error(
             "the daemon cannot ask for PINs on this desktop: {}",

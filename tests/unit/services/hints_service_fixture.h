@@ -14,6 +14,7 @@
 #include "fake_pairing_store.h"
 #include "fake_pin_prompt.h"
 #include "fake_tokens.h"
+#include "fake_user_keyrings.h"
 #include "platform/property_list.h"
 #include "platform/token_framework.h"
 #include "platform_test.h"
@@ -93,6 +94,7 @@ protected:
     fakes::FakeCallerWatch callers;
     fakes::FakeCallerSessions sessions;
     fakes::FakeAuthority authority;
+    fakes::FakeUserKeyrings keyrings;
     Proofs proofs{[this] { return now; }};
     AdministratorRight right{authority};
     std::uint8_t lastRandom = 0;
@@ -104,6 +106,7 @@ protected:
             },
             [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
         .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
+        .unlockKeys = {tokens, pairings, pairings, keyrings},
         .callers = callers,
     }};
 
