@@ -6,14 +6,11 @@
 #include <array>
 #include <utility>
 
+#include "services/hints/tokens/key_strength.h"
 #include "services/hints/tokens/openssl_handles.h"
 
 namespace vlm::service {
 namespace {
-
-// Of about the same strength.
-constexpr int kSmallestRsaKey = 2048;
-constexpr int kSmallestCurve = 224;
 
 // The key, when nobody but its holder can undo what is done with it.
 KeyHandle soundKey(std::span<const std::uint8_t> der, WrapScheme scheme) {

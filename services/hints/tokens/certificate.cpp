@@ -5,6 +5,7 @@
 #include <ctime>
 
 #include "services/hints/tokens/card_text.h"
+#include "services/hints/tokens/key_strength.h"
 #include "services/hints/tokens/openssl_handles.h"
 #include "services/hints/tokens/signature.h"
 
@@ -104,9 +105,12 @@ bool readKey(EVP_PKEY* key, CertificateFacts& facts) {
 void readKeyUsage(X509* certificate, CertificateFacts& facts) {
     const std::uint32_t usage = X509_get_key_usage(certificate);  // all bits when it is absent
     const bool rsa = facts.keyKind == KeyKind::Rsa;
+    const bool strong = EVP_PKEY_get_bits(X509_get0_pubkey(certificate)) >=
+                        (rsa ? kSmallestRsaKey : kSmallestCurve);
+    const std::uint32_t wrapping =
+        rsa ? KU_KEY_ENCIPHERMENT | KU_DATA_ENCIPHERMENT : KU_KEY_AGREEMENT;
     facts.maySign = (usage & (KU_DIGITAL_SIGNATURE | KU_NON_REPUDIATION)) != 0;
-    facts.mayWrap =
-        (usage & (rsa ? KU_KEY_ENCIPHERMENT | KU_DATA_ENCIPHERMENT : KU_KEY_AGREEMENT)) != 0;
+    facts.mayWrap = strong && (usage & wrapping) != 0;
 }
 
 }  // namespace

@@ -5,12 +5,11 @@
 
 #include <algorithm>
 
+#include "services/hints/tokens/key_strength.h"
 #include "services/hints/tokens/openssl_handles.h"
 
 namespace vlm::service {
 namespace {
-
-constexpr int kSmallestRsaKey = 2048;
 
 // The key, when it is of a kind that signs here and the DER holds nothing else.
 KeyHandle readKey(std::span<const std::uint8_t> der) {

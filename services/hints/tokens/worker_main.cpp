@@ -31,16 +31,16 @@ public:
         while (const auto message = readFrame(kSocket)) {
             auto request = decodeRequest(*message);
             if (!request) return;
-            std::optional<Bytes> answer;
+            bool answered = false;
             if (auto* proof = std::get_if<ProofRequest>(&*request)) {
                 auto pin = readSecretFrame(kSocket, kMostPinBytes);
                 if (!pin) return;
                 proof->pin = std::move(*pin);
-                answer = prove(std::move(*proof));
+                answered = prove(std::move(*proof));
             } else {
-                answer = list();
+                answered = write(list());
             }
-            if (!answer || !writeFrame(kSocket, *answer)) return;
+            if (!answered) return;
         }
     }
 
@@ -63,9 +63,18 @@ private:
         return encodeAnswer(answer);
     }
 
-    std::optional<Bytes> prove(ProofRequest request) {
-        if (const auto failed = load()) return encodeAnswer(*failed);
-        return encodeAnswer(_module->prove(std::move(request)));
+    bool prove(ProofRequest request) {
+        if (const auto failed = load()) return write(encodeAnswer(*failed));
+        bool told = false;
+        const auto opening = _module->prove(
+            std::move(request), [&told](const Proof& proof) { told = write(encodeAnswer(proof)); });
+        if (!told || !opening) return told;
+        return write(encodeAnswer(OpeningAnswer{opening->whyNot})) &&
+               writeFrame(kSocket, opening->opened.octets());
+    }
+
+    static bool write(const std::optional<Bytes>& answer) {
+        return answer && writeFrame(kSocket, *answer);
     }
 
     std::string _modulePath;

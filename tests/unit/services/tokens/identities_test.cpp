@@ -44,6 +44,8 @@ KeyObject keyOf(const CertificateObject& certificate, bool isPrivate = false) {
 
 class AddIdentitiesTest : public testing::Test {
 protected:
+    AddIdentitiesTest() { objects.wrapMechanisms = {.oaep = true, .pkcs1 = true, .ecdh = true}; }
+
     void show(const CertificateObject& certificate) { objects.certificates.push_back(certificate); }
     void show(const KeyObject& key) {
         objects.keys.push_back(key);
@@ -208,6 +210,34 @@ TEST_F(AddIdentitiesTest, WrapsByTheSmallestRsaKeyElseTheSmallestEcKey) {
     showWithKey(certificate("rsa", 4, KeyKind::Rsa));
     showWithKey(certificate("smaller rsa", 3, KeyKind::Rsa));
     EXPECT_EQ(made().wrapKeyHash, Bytes(32, 3));
+}
+
+TEST_F(AddIdentitiesTest, WrapsInTheBestWayThatTheTokenOffers) {
+    struct Case {
+        const char* why;
+        WrapMechanisms mechanisms;
+        std::optional<std::uint8_t> key;
+        WrapScheme scheme;
+    };
+    const std::vector<Case> cases = {
+        {"everything", {true, true, true}, 2, WrapScheme::RsaOaepSha256},
+        {"no ECDH", {true, true, false}, 2, WrapScheme::RsaOaepSha256},
+        {"the old padding is the last choice", {false, true, true}, 1, WrapScheme::Ecdh},
+        {"and the only one", {false, true, false}, 2, WrapScheme::RsaPkcs1},
+        {"ECDH only", {false, false, true}, 1, WrapScheme::Ecdh},
+        {"nothing", {false, false, false}, std::nullopt, WrapScheme::RsaOaepSha256},
+    };
+    showWithKey(certificate("ec", 1));
+    showWithKey(certificate("rsa", 2, KeyKind::Rsa));
+    for (const Case& each : cases) {
+        objects.wrapMechanisms = each.mechanisms;
+
+        const Token token = made();
+
+        const auto expected = each.key ? std::optional(Bytes(32, *each.key)) : std::nullopt;
+        EXPECT_EQ(token.wrapKeyHash, expected) << each.why;
+        EXPECT_EQ(token.wrapScheme, each.scheme) << each.why;
+    }
 }
 
 TEST_F(AddIdentitiesTest, WrapsByNoKeyThatOrWhoseCertificateDoesNotAllowIt) {

@@ -12,8 +12,7 @@ const Bytes kChallenge(32, 0x11);
 
 // Made once: it takes its time.
 const KeyHandle& rsaKey() {
-    static const KeyHandle kKey(
-        EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", std::size_t{2048}));
+    static const KeyHandle kKey(EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", std::size_t{2048}));
     return kKey;
 }
 KeyHandle makeEc(const char* curve) {
