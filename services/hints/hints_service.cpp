@@ -6,6 +6,7 @@
 
 #include "platform/accounts.h"
 #include "platform/platform.h"
+#include "platform/text.h"
 #include "services/hints/account_spelling.h"
 #include "services/hints/card_login.h"
 #include "services/hints/hints_log.h"
@@ -14,6 +15,7 @@
 #include "services/hints/reply.h"
 #include "services/hints/request.h"
 #include "services/hints/status.h"
+#include "services/hints/unlock_key_changes.h"
 
 namespace vlm::service {
 
@@ -37,6 +39,16 @@ Outcome<Message> pairingsReply(const std::vector<Pairing>& pairings,
         if (!inserted || inserted->contains(pairing.hash))
             hashes.append(std::to_string(hashes.size()), pairing.hash);
     return listReply(std::move(hashes));
+}
+
+// The whole sentence of a refusal whose text says why.
+Refusal explained(const std::string& asked, const Refusal& refusal) {
+    return {refusal.status, platform::text("{}: {}", asked, refusal.text)};
+}
+
+Outcome<Message> statusReply(const std::optional<Refusal>& refusal) {
+    if (refusal) return *refusal;
+    return numberReply(status::kSuccess);
 }
 
 }  // namespace
@@ -74,6 +86,14 @@ void HintsService::serve(const Caller& caller, Request request, const Answer& an
         case Operation::SessionLogin:
             return answer(noteSessionLogin(request));
         case Operation::UnlockKeybag:
+            return unlockKeyring(caller, request, answer);
+        case Operation::NameKeyring:
+            return nameKeyring(caller, request, answer);
+        case Operation::StoreUnlockKey:
+            return storeUnlockKey(caller, std::move(request), answer);
+        case Operation::EraseUnlockKey:
+        case Operation::PasswordChanged:
+            return answer(changeUnlockKeys(caller, request));
         case Operation::TokenEndpoints:
             return answer(refused(status::kNotServed, request, "this service does not do that."));
     }
@@ -110,7 +130,7 @@ void HintsService::logInWithCard(const Caller& caller, Request request, const An
     const auto number = begin(caller);
     if (!number) return;
     const CardLoginParts parts{_parts.login, _parts.changes.sessions, _loginPolicy,
-                               _parts.unlockKeys};
+                               _parts.unlockKeys.keys};
     const auto login = std::make_shared<CardLogin>(
         parts, caller, std::move(request),
         [this, number = *number, answer](Outcome<Message> outcome) {
@@ -124,13 +144,61 @@ void HintsService::changePairing(const Caller& caller, Request request, const An
     const auto number = begin(caller);
     if (!number) return;
     const auto done = [this, number = *number, answer](const std::optional<Refusal>& refusal) {
-        if (refusal) return end(number, *refusal, answer);
-        end(number, numberReply(status::kSuccess), answer);
+        end(number, statusReply(refusal), answer);
     };
     const auto change =
         std::make_shared<PairingChange>(_parts.changes, caller, std::move(request), done);
     _running[*number].work = change;
     change->start();
+}
+
+void HintsService::storeUnlockKey(const Caller& caller, Request request, const Answer& answer) {
+    const auto number = begin(caller);
+    if (!number) return;
+    const auto done = [this, number = *number, answer](const std::optional<Refusal>& refusal) {
+        end(number, statusReply(refusal), answer);
+    };
+    const auto storing =
+        std::make_shared<UnlockKeyStoring>(_parts.unlockKeys, caller, std::move(request), done);
+    _running[*number].work = storing;
+    storing->start();
+}
+
+void HintsService::nameKeyring(const Caller& caller, const Request& request, const Answer& answer) {
+    const auto number = begin(caller);
+    if (!number) return;
+    const auto done = [this, number = *number, answer,
+                       asked = describe(request)](const Outcome<std::string>& name) {
+        if (!name) return end(number, explained(asked, name.refusal()), answer);
+        auto reply = numberReply(status::kSuccess);
+        reply.set("str1", *name);
+        end(number, std::move(reply), answer);
+    };
+    _running[*number].work = std::shared_ptr(_parts.unlockKeys.keyrings.name(request.user, done));
+}
+
+void HintsService::unlockKeyring(const Caller& caller, const Request& request,
+                                 const Answer& answer) {
+    const auto number = begin(caller);
+    if (!number) return;
+    const auto done = [this, number = *number, answer,
+                       asked = describe(request)](const std::optional<Refusal>& refusal) {
+        if (refusal) return end(number, explained(asked, *refusal), answer);
+        end(number, numberReply(status::kSuccess), answer);
+    };
+    _running[*number].work =
+        std::shared_ptr(_parts.unlockKeys.keyrings.unlock(request.user, *request.password, done));
+}
+
+Outcome<Message> HintsService::changeUnlockKeys(const Caller& caller, const Request& request) {
+    auto& keys = _parts.unlockKeys.keys;
+    if (request.operation == Operation::EraseUnlockKey)
+        return statusReply(eraseUnlockKey(keys, caller, request));
+    const auto count = wrapAnew(keys, caller, request);
+    if (!count) return count.refusal();
+    auto reply = numberReply(status::kSuccess);
+    reply.set("num1", static_cast<std::int64_t>(*count));
+    return reply;
 }
 
 std::optional<std::uint64_t> HintsService::begin(const Caller& caller) {

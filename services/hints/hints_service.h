@@ -22,7 +22,7 @@
 #include "services/hints/pairing_change.h"
 #include "services/hints/session_login.h"
 #include "services/hints/token_info.h"
-#include "services/hints/unlock_key_store.h"
+#include "services/hints/unlock_key_storing.h"
 
 namespace vlm::service {
 
@@ -31,7 +31,7 @@ public:
     struct Parts {
         LoginParts login;
         PairingChangeParts changes;
-        UnlockKeyStore& unlockKeys;
+        UnlockKeyParts unlockKeys;
         SessionLogin sessionLogin;
         CallerWatch& callers;
     };
@@ -59,6 +59,10 @@ private:
                                               const std::vector<Token>& tokens);
     void changePairing(const Caller& caller, Request request, const Answer& answer);
     void listPairings(const Request& request, const Answer& answer);
+    void storeUnlockKey(const Caller& caller, Request request, const Answer& answer);
+    void nameKeyring(const Caller& caller, const Request& request, const Answer& answer);
+    void unlockKeyring(const Caller& caller, const Request& request, const Answer& answer);
+    Outcome<platform::Message> changeUnlockKeys(const Caller& caller, const Request& request);
     Outcome<platform::Message> isPaired(const Request& request);
     Outcome<platform::Message> noteSessionLogin(const Request& request);
 

@@ -20,6 +20,8 @@ bool concernsCaller(const Caller& caller, const Request& request) {
         case Operation::IsPaired:
         case Operation::FindLoginCard:
         case Operation::CardLogin:
+        case Operation::EraseUnlockKey:
+        case Operation::PasswordChanged:
             return platform::current().accounts().userId(request.account) == caller.user;
         case Operation::SessionLogin:
             return false;

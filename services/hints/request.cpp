@@ -9,6 +9,7 @@
 #include "platform/text.h"
 #include "services/hints/secret_pipe.h"
 #include "services/hints/status.h"
+#include "services/keychain/unlock_key_wrapping.h"
 
 namespace vlm::service {
 
@@ -64,21 +65,25 @@ public:
     }
 
     const std::string* optionalText(std::string_view key, std::size_t most) {
+        const auto* value = anyText(key, most);
+        if (value && value->empty()) refuse(platform::text("\"{}\" is empty", key));
+        return value;
+    }
+
+    const std::string* anyText(std::string_view key, std::size_t most) {
         const auto* value = message().text(key);
         if (!value && isThere(key)) missing(key, "text");
-        if (!value) return nullptr;
-        if (value->empty()) refuse(platform::text("\"{}\" is empty", key));
-        if (value->size() > most)
+        if (value && value->size() > most)
             refuse(platform::text("\"{}\" has {} bytes, and {} is the most", key, value->size(),
                                   most));
         return value;
     }
 
-    platform::Bytes hash() {
-        const auto* value = message().bytes("dat1");
-        if (!value) return missing("dat1", "bytes"), platform::Bytes();
+    platform::Bytes hash(std::string_view key = "dat1") {
+        const auto* value = message().bytes(key);
+        if (!value) return missing(key, "bytes"), platform::Bytes();
         if (value->size() != kHashSize)
-            refuse(platform::text("\"dat1\" has {} bytes, and a public-key hash has {}",
+            refuse(platform::text("\"{}\" has {} bytes, and a public-key hash has {}", key,
                                   value->size(), kHashSize));
         return *value;
     }
@@ -91,6 +96,15 @@ public:
         if (!pin || pin->text().size() > kMostPin)
             refuse(platform::text("\"{}\" is no pipe that holds a PIN", key));
         return pin;
+    }
+
+    std::optional<Secret> passwordInPipe(std::string_view key) {
+        const auto pipe = message().endpoint(key);
+        if (!pipe) return missing(key, "a pipe"), std::nullopt;
+        auto password = secretIn(*pipe);
+        if (!password || password->text().size() > kMostUnlockKeyBytes)
+            refuse(platform::text("\"{}\" is no pipe that holds a password", key));
+        return password;
     }
 
     // The token that a query of the form {"tokid": token} is restricted to; empty for all tokens.
@@ -155,6 +169,15 @@ void readSessionLogin(Reader& reader, Request& request) {
     request.tokenIdentifier = reader.text("str3", kMostTokenIdentifier);
 }
 
+void readStoring(Reader& reader, Request& request) {
+    request.user = reader.user();
+    request.hash = reader.hash();
+    request.wrapKeyHash = reader.hash("dat2");
+    request.tokenIdentifier = reader.text("str1", kMostTokenIdentifier);
+    request.keyring = reader.text("str2", kMostOtherText);
+    reader.anyText("str3", kMostOtherText);
+}
+
 void readArguments(Reader& reader, Request& request) {
     switch (request.operation) {
         case Operation::Login:
@@ -175,12 +198,13 @@ void readArguments(Reader& reader, Request& request) {
             return;
         case Operation::UnlockKeybag:
             request.user = reader.user();
-            reader.text("str1", kMostOtherText);
+            request.password = Secret(reader.text("str1", kMostUnlockKeyBytes));
             return;
         case Operation::IsPaired:
             request.account = reader.text("str1", kMostAccountName);
             return;
         case Operation::TokenEndpoints:
+        case Operation::NameKeyring:
             request.user = reader.user();
             return;
         case Operation::FindLoginCard:
@@ -191,6 +215,16 @@ void readArguments(Reader& reader, Request& request) {
             return readCardLogin(reader, request);
         case Operation::SessionLogin:
             return readSessionLogin(reader, request);
+        case Operation::StoreUnlockKey:
+            return readStoring(reader, request);
+        case Operation::EraseUnlockKey:
+            request.hash = reader.hash();
+            request.account = reader.text("str1", kMostAccountName);
+            return;
+        case Operation::PasswordChanged:
+            request.account = reader.text("str1", kMostAccountName);
+            request.password = reader.passwordInPipe("dat1");
+            return;
     }
 }
 
@@ -207,6 +241,10 @@ bool isOperation(std::uint64_t code) {
         case Operation::FindLoginCard:
         case Operation::CardLogin:
         case Operation::SessionLogin:
+        case Operation::NameKeyring:
+        case Operation::StoreUnlockKey:
+        case Operation::EraseUnlockKey:
+        case Operation::PasswordChanged:
             return true;
     }
     return false;
@@ -217,7 +255,8 @@ bool isOperation(std::uint64_t code) {
 Outcome<Request> readRequest(const IncomingRequest& incoming) {
     Reader reader(incoming);
     const auto code = reader.number("op");
-    if (!isOperation(code)) reader.refuse(platform::text("\"op\" is {}, which is no operation", code));
+    if (!isOperation(code))
+        reader.refuse(platform::text("\"op\" is {}, which is no operation", code));
     if (reader.refusal()) return *reader.refusal();
 
     Request request;
@@ -243,7 +282,7 @@ std::string describe(const Request& request) {
         case Operation::Pairings:
             return platform::text("Listing the pairings of {}", account);
         case Operation::UnlockKeybag:
-            return "Unlocking a key bag";
+            return "Unlocking a login keyring";
         case Operation::IsPaired:
             return platform::text("Asking whether {} is paired", account);
         case Operation::TokenEndpoints:
@@ -255,6 +294,15 @@ std::string describe(const Request& request) {
             return platform::text("Logging in {} with a card", account);
         case Operation::SessionLogin:
             return platform::text("Noting the card that logged in {}", account);
+        case Operation::NameKeyring:
+            return platform::text("Naming the login keyring of user {}", request.user);
+        case Operation::StoreUnlockKey:
+            return platform::text("Storing the key that opens the login keyring of user {} with {}",
+                                  request.user, hash);
+        case Operation::EraseUnlockKey:
+            return platform::text("Erasing the unlock key of {} for {}", account, hash);
+        case Operation::PasswordChanged:
+            return platform::text("Wrapping the new password of {}", account);
     }
     return {};
 }

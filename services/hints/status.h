@@ -31,6 +31,9 @@ inline constexpr Status kRightUnknown = -2017;  // whether an administrator allo
 inline constexpr Status kNoLoginCard = -2018;   // no card to log in with; the password is asked for
 inline constexpr Status kCardRequired = -2019;  // likewise, and no other login is allowed
 inline constexpr Status kCertificateRefused = -2020;  // expired, not yet valid or not trusted
-inline constexpr Status kUnlockKeyShut = -2024;  // only told: the login itself is good
+inline constexpr Status kNoKeyring = -2021;           // no login keyring, or nobody there to ask
+inline constexpr Status kKeyringRefused = -2022;      // the keyring did not take the password
+inline constexpr Status kNoWrapKey = -2023;           // the card has no key that can wrap
+inline constexpr Status kUnlockKeyShut = -2024;       // only told: the login itself is good
 
 }  // namespace vlm::service::status

@@ -9,6 +9,7 @@
 #include "services/hints/bus_caller_watch.h"
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_server.h"
+#include "services/hints/bus_user_keyrings.h"
 #include "services/hints/caller_pin_prompt.h"
 #include "services/hints/certificate_trust.h"
 #include "services/hints/counted_work.h"
@@ -84,13 +85,14 @@ Idleness::Parts idlenessOf(sd_event* event, const Options& options, const Proofs
 
 // Whoever asks from now on starts the service anew; what came before is still answered. A question
 // to a person would keep the new one waiting for as long as that person takes.
-void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, PolkitAuthority& polkit,
-           Idleness& idleness) {
+void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt,
+           BusUserKeyrings& keyrings, PolkitAuthority& polkit, Idleness& idleness) {
     kLog.info("leaving after a quiet time");
     // First, so that systemd neither ends this process for the loss of its name nor takes it for
     // the one that serves.
     sd_notify(0, "STOPPING=1");
     prompt.askNobody();
+    keyrings.askNobody();
     polkit.askNobody();
     bus.release([&] { idleness.callWhenDone([&] { loop.end(); }); });
 }
@@ -116,21 +118,22 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     JudgedTokens judged({cards, anchors, trust, isTrustChecked, secondsNow});
     CountedTokens tokens(judged, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
+    BusUserKeyrings keyrings(loop.get(), prompters, {});
     LogindCallerSessions sessions(connection);
     PolkitAuthority polkit(connection);
     AdministratorRight right(polkit);
     const SessionCards sessionCards;
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
                           .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
-                          .unlockKeys = **pairings,
+                          .unlockKeys = {tokens, **pairings, **pairings, keyrings},
                           .sessionLogin = {sessionCards, isSession},
                           .callers = callers});
     CountedExchanges requests(service, idleness);
-    BusServer server(connection, kHintsInterface, "Exchange", requests);
+    BusServer server(connection, kHintsInterface, {{"Exchange", requests}});
 
     if (!server.start() || !prompters.start()) return {"the bus does not take the service"};
     if (auto reason = (*bus)->claim(kDaemonName); !reason.empty()) return {reason};
-    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, polkit, idleness); });
+    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, keyrings, polkit, idleness); });
     return {{}, loop.run()};
 }
 

@@ -17,9 +17,6 @@ namespace {
 using platform::Message;
 using service::Operation;
 
-// The password of an account has changed.
-constexpr auto kPasswordChanged = Operation{13};
-
 constexpr platform::PropertyListLimits kPairingsLimits = {
     .depth = 4, .objects = 4096, .bytes = std::size_t{1} << 20U};
 
@@ -76,7 +73,7 @@ int AfterLogin::changePassword() {
     const auto token = transaction.token();
     const auto pipe = token ? service::pipeHolding(*token) : std::nullopt;
     if (!pipe) return PAM_AUTHTOK_ERR;
-    auto request = requestOf(kPasswordChanged);
+    auto request = requestOf(Operation::PasswordChanged);
     request.set("str1", transaction.user());
     request.set("dat1", *pipe);
     if (isDone(exchange(request, patience))) return PAM_SUCCESS;

@@ -15,6 +15,7 @@
 #include "fake_pairing_store.h"
 #include "fake_pin_prompt.h"
 #include "fake_tokens.h"
+#include "fake_user_keyrings.h"
 #include "platform/property_list.h"
 #include "platform/token_framework.h"
 #include "platform_test.h"
@@ -95,6 +96,7 @@ protected:
     fakes::FakeCallerWatch callers;
     fakes::FakeCallerSessions sessions;
     fakes::FakeAuthority authority;
+    fakes::FakeUserKeyrings keyrings;
     Proofs proofs{[this] { return now; }};
     AdministratorRight right{authority};
     test::TemporaryFolder folder;
@@ -111,7 +113,7 @@ protected:
             },
             [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
         .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
-        .unlockKeys = pairings,
+        .unlockKeys = {tokens, pairings, pairings, keyrings},
         .sessionLogin = sessionLogin,
         .callers = callers,
     }};
