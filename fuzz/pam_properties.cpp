@@ -25,16 +25,17 @@ public:
     explicit Choices(std::span<const std::uint8_t> data) : _data(data) {}
 
     std::uint8_t byte() {
-        if (_choices.empty()) return 0;
-        const auto first = _choices.front();
+        if (_data.empty()) return 0;
+        const auto first = _data.front();
         _data = _data.subspan(1);
         return first;
     }
     bool flag() { return byte() % 2 != 0; }
-    std::int64_t number() { return static_cast<std::int64_t>(byte() | byte() << 8U) - 2100; }
+    // Every status is among them.
+    std::int64_t number() { return std::int64_t{byte()} - 2200 + (flag() ? 2200 : 0); }
     std::string text() {
-        const auto size = std::min<std::size_t>(byte() * 2, _choices.size());
-        std::string taken(_choices.begin(), _choices.begin() + static_cast<std::ptrdiff_t>(size));
+        const auto size = std::min<std::size_t>(byte() * 2, _data.size());
+        std::string taken(_data.begin(), _data.begin() + static_cast<std::ptrdiff_t>(size));
         _data = _data.subspan(size);
         return taken;
     }
@@ -42,6 +43,13 @@ public:
 private:
     std::span<const std::uint8_t> _data;
 };
+
+// What the card is called ends neither the line nor its quotes.
+bool isHarmless(std::string_view shown) {
+    const bool isPrompt = shown.starts_with("PIN of the card");
+    return platform::harmlessText(shown, platform::kAllCharacters) == shown &&
+           (!isPrompt || std::ranges::count(shown, '"') == 2);
+}
 
 // Whoever PAM talks to: answers, fails, and answers while failing.
 struct Application {
@@ -51,9 +59,7 @@ struct Application {
     static int converse(int, const pam_message** messages, pam_response** responses, void* self) {
         auto& application = *static_cast<Application*>(self);
         const std::string_view shown = messages[0]->msg;
-        application.isTextHarmless =
-            application.isTextHarmless &&
-            platform::harmlessText(shown, platform::kAllCharacters) == shown;
+        if (!isHarmless(shown)) application.isTextHarmless = false;
         auto& choices = application.choices;
         *responses = nullptr;
         if (choices.flag()) {

@@ -14,8 +14,8 @@
 #include "services/hints/removal_action.h"
 #include "services/hints/service_names.h"
 #include "services/hints/session_tokens.h"
-#include "settings/smartcard_settings_worker.h"
 #include "services/keychain/secret_service_keyring.h"
+#include "settings/smartcard_settings_worker.h"
 
 namespace vlm::service {
 
