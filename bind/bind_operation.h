@@ -115,8 +115,9 @@ public:
     platform::Status unpairUser(const OptionalHash& publicKeyHash, const OptionalText& userName,
                                 ErrorPlace error);
 
-    // Stores the key that opens the user's login keyring after a login with this card. This
-    // version cannot do that yet, and always refuses.
+    // Stores the key that opens the user's login keyring after a login with this card, which was
+    // paired before; the user has to be the one at the console. May ask that user for the keyring's
+    // password. A status of the keychain's comes without an error.
     platform::Status storeUnlockKey(const OptionalHash& publicKeyHash, ErrorPlace error);
 
     // The maps: null, or none to set, when absent; an absent map counts as an empty one in every
@@ -169,6 +170,8 @@ private:
                                   ErrorPlace error) const;
     platform::Status refusePairing(const OptionalHash& publicKeyHash, ErrorPlace error) const;
     void eraseUnlockKey(const OptionalHash& publicKeyHash, const OptionalText& user) const;
+    platform::Status _storeUnlockKey(const Bytes& publicKeyHash, const std::string& token,
+                                     const Bytes& wrapKeyHash) const;
 
     Snapshot<WrapKeysHashMap> _wrapKeysHashMap;
     Snapshot<UnpairedIdentities> _unpairedIdentities;

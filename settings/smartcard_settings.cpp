@@ -8,37 +8,6 @@
 using vlm::hints::log;
 using vlm::platform::String;
 
-namespace {
-
-// Whether certificates are mapped to accounts by what they say, so that users need no pairing.
-bool attributesAreMapped(const std::filesystem::path& configurationFile) {
-    const auto configuration = vlm::copySmartCardConfiguration(configurationFile);
-    return configuration && configuration->contains("AttributeMapping");
-}
-
-bool unmappedUsersAreAllowed() { return VLGetSmartcardSettingWorker("allowUnmappedUsers") != 0; }
-
-}  // namespace
-
-namespace vlm {
-
-std::int32_t settingForUser(const String& key, const std::optional<String>& userName,
-                            const std::filesystem::path& configurationFile) {
-    log().info("VLGetSmartcardSettingForUser {}, {}", key, userName);
-    if (!userName) log().info("No username was provided {}, {}", key, userName);
-
-    std::int32_t value = VLGetSmartcardSettingWorker(key);
-    // Who may log in without a card must not be locked out by a card that was never paired.
-    if (value != 0 && key == "enforceSmartCard" && unmappedUsersAreAllowed() &&
-        !attributesAreMapped(configurationFile) && !VLIsUserBound(userName))
-        value = 0;
-
-    log().info("Returning value {}", value);
-    return value;
-}
-
-}  // namespace vlm
-
 std::int32_t VLGetSmartcardSetting(const String& key) {
     log().info("VLGetSmartcardSetting {}", key);
     const std::int32_t value = VLGetSmartcardSettingWorker(key);
@@ -48,7 +17,7 @@ std::int32_t VLGetSmartcardSetting(const String& key) {
 
 std::int32_t VLGetSmartcardSettingForUser(const String& key,
                                           const std::optional<String>& userName) {
-    return vlm::settingForUser(key, userName, vlm::kSmartcardConfiguration);
+    return vlm::settingForUser(key, userName, vlm::kSmartcardConfiguration, VLIsUserBound);
 }
 
 vlm::SmartcardSettingOrigin VLGetSmartcardSettingOrigin(const String& key) {

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <filesystem>
+#include <functional>
 #include <optional>
 
 #include "platform/property_list.h"
@@ -22,10 +23,15 @@ struct ResolvedSetting {
 
 ResolvedSetting resolveSetting(const platform::String& key);
 
-// VLGetSmartcardSettingForUser() with the configuration file at this path.
+// Whether the user is paired with a card, as far as who asks can tell.
+using IsUserBound = std::function<bool(const std::optional<platform::String>& userName)>;
+
+// VLGetSmartcardSettingForUser() with the configuration file at this path, for programs that must
+// not ask the hints service, or are it.
 std::int32_t settingForUser(const platform::String& key,
                             const std::optional<platform::String>& userName,
-                            const std::filesystem::path& configurationFile);
+                            const std::filesystem::path& configurationFile,
+                            const IsUserBound& isUserBound);
 
 }  // namespace vlm
 

@@ -26,6 +26,27 @@ std::string reason(Status status, const std::optional<Error>& error) {
     return Error{std::string(platform::VLErrorDomain), status, std::nullopt}.description();
 }
 
+// The keychain's failures come as a number alone, which is no help to a person.
+std::string whyNotStored(Status status) {
+    switch (status) {
+        case -2004:
+            return "The smart card was pulled out. Unpair it, insert it and pair it again.";
+        case -2007:
+            return "The password of the login keyring was not entered. Unpair the smart card and "
+                   "pair it again to be asked once more.";
+        case -2021:
+            return "There is no login keyring, or nobody on the user's desktop can be asked for "
+                   "its password. Pair again when the user is logged in there.";
+        case -2022:
+            return "The password that was entered does not open the login keyring. Unpair the "
+                   "smart card and pair it again to be asked once more.";
+        case -2023:
+            return "The smart card has no key that can protect the login keyring's password.";
+        default:
+            return Error{std::string(platform::VLErrorDomain), status, std::nullopt}.description();
+    }
+}
+
 bool mayPair(const Options& options) {
     return VLGetSmartcardSetting("oneCardPerUser") == 0 || !VLIsUserBound(options.userName);
 }
@@ -33,13 +54,14 @@ bool mayPair(const Options& options) {
 void storeUnlockKey(BindOperation& operation, const Options& options, Console& console) {
     const auto hex = BindUtils::dataToHex(options.publicKeyHash);
     std::optional<Error> error;
-    if (operation.storeUnlockKey(options.publicKeyHash, &error) == kSuccess) {
+    const Status status = operation.storeUnlockKey(options.publicKeyHash, &error);
+    if (status == kSuccess) {
         if (options.verbose)
             console.print(text("User was successfully paired (public key hash: {}).", hex));
         return;
     }
     console.print(text("Failed to store Login keychain unlock key. {}",
-                       error ? harmlessText(error->description()) : ""));
+                       error ? harmlessText(error->description()) : whyNotStored(status)));
     console.print(
         text("User was successfully paired (public key hash: {}) but user password will "
              "be required after next SmartCard login to unlock Login keychain.",

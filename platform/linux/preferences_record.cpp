@@ -64,35 +64,7 @@ void parse(PreferencesRecord& record, const Bytes& content) {
     record.entries = *list->dictionary();
 }
 
-timespec clockOfFiles() {
-    timespec now{};
-    clock_gettime(CLOCK_REALTIME_COARSE, &now);
-    return now;
-}
-
 }  // namespace
-
-FileStamp FileStamp::of(const struct stat& status) {
-    return {status.st_dev, status.st_ino, status.st_size, status.st_mtim, status.st_ctim};
-}
-
-bool FileStamp::operator==(const FileStamp& other) const {
-    const auto equal = [](const timespec& one, const timespec& two) {
-        return one.tv_sec == two.tv_sec && one.tv_nsec == two.tv_nsec;
-    };
-    return device == other.device && number == other.number && size == other.size &&
-           equal(modified, other.modified) && equal(changed, other.changed);
-}
-
-bool isSettled(const timespec& changed, const timespec& now) {
-    // Some file systems keep whole seconds only, or pairs of them; the others lag by a tick of some
-    // milliseconds.
-    constexpr long kNanoseconds = 1'000'000'000;
-    const time_t seconds = now.tv_sec - changed.tv_sec;
-    if (changed.tv_nsec == 0) return seconds > 2;
-    if (seconds < 0 || seconds > 1) return seconds > 1;
-    return seconds * kNanoseconds + now.tv_nsec - changed.tv_nsec > kNanoseconds / 10;
-}
 
 PreferencesRecord readRecord(const FileDescriptor& folder, const std::string& fileName,
                              const PreferencesFolder& rules) {

@@ -9,15 +9,13 @@
 
 #pragma once
 
-#include <sys/stat.h>
-
 #include <cstddef>
-#include <ctime>
 #include <optional>
 #include <string>
 #include <string_view>
 
 #include "platform/linux/file_descriptor.h"
+#include "platform/linux/file_stamp.h"
 #include "platform/linux/preferences_folders.h"
 #include "platform/property_list.h"
 
@@ -33,23 +31,6 @@ inline constexpr PropertyListLimits kRecordLimits{
 inline std::string recordFileName(std::string_view domain) {
     return std::string(domain) + ".plist";
 }
-
-// Tells a file's content from any other that was or will be at the same path.
-struct FileStamp {
-    dev_t device = 0;
-    ino_t number = 0;
-    off_t size = 0;
-    timespec modified{};
-    timespec changed{};
-
-    static FileStamp of(const struct stat& status);
-    bool operator==(const FileStamp& other) const;
-};
-
-// Whether every change from now on gives a file another time of change than the one it has. In the
-// tick of the file system's clock in which the last change was made, one more of the same size
-// leaves no trace.
-bool isSettled(const timespec& changed, const timespec& now);
 
 struct PreferencesRecord {
     enum class State {

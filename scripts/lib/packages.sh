@@ -2,7 +2,7 @@
 
 build_packages=(
     ca-certificates ccache cmake g++ gettext ninja-build pkg-config
-    libp11-kit-dev libpcsclite-dev libpugixml-dev libseccomp-dev libsqlite3-dev libsqlitecpp-dev libssl-dev libsystemd-dev
+    libp11-kit-dev libpam0g-dev libpcsclite-dev libpugixml-dev libseccomp-dev libsqlite3-dev libsqlitecpp-dev libssl-dev libsystemd-dev
     libqt6opengl6-dev libqt6svg6 qt6-base-dev qt6-tools-dev
 )
 

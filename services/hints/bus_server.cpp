@@ -1,6 +1,7 @@
 #include "services/hints/bus_server.h"
 
 #include <algorithm>
+#include <string_view>
 #include <utility>
 
 #include "platform/linux/sd_bus_message.h"
@@ -43,16 +44,16 @@ private:
     platform::SdBusMessage _call;
 };
 
-BusServer::BusServer(sd_bus* bus, const char* interface, const char* method, Exchanges& exchanges)
-    : _bus(bus),
-      _interface(interface),
-      _exchanges(exchanges),
-      // Anyone may call: who may have what done is decided for each request.
-      _members{{SD_BUS_VTABLE_START(0),
-                SD_BUS_METHOD_WITH_ARGS(method, SD_BUS_ARGS("a{sv}", request),
-                                        SD_BUS_RESULT("a{sv}", reply), onCall,
-                                        SD_BUS_VTABLE_UNPRIVILEGED),
-                SD_BUS_VTABLE_END}} {}
+BusServer::BusServer(sd_bus* bus, const char* interface, std::vector<Method> methods)
+    : _bus(bus), _interface(interface), _methods(std::move(methods)) {
+    _members.push_back(SD_BUS_VTABLE_START(0));
+    // Anyone may call: who may have what done is decided for each request.
+    for (const auto& method : _methods)
+        _members.push_back(SD_BUS_METHOD_WITH_ARGS(method.name, SD_BUS_ARGS("a{sv}", request),
+                                                   SD_BUS_RESULT("a{sv}", reply), onCall,
+                                                   SD_BUS_VTABLE_UNPRIVILEGED));
+    _members.push_back(SD_BUS_VTABLE_END);
+}
 
 bool BusServer::start() {
     sd_bus_slot* slot = nullptr;
@@ -86,9 +87,14 @@ void BusServer::receive(sd_bus_message* call) {
     std::ranges::move(read->repeatedKeys, std::back_inserter(request.unreadableKeys));
 
     const auto waiting = std::make_shared<Waiting>(_counts, caller->user, call);
-    _exchanges.handle(*caller, request, [this, waiting](const Message& reply) {
+    exchangesFor(call).handle(*caller, request, [this, waiting](const Message& reply) {
         if (const auto answered = waiting->end()) send(answered.get(), reply);
     });
+}
+
+Exchanges& BusServer::exchangesFor(sd_bus_message* call) const {
+    const std::string_view member = sd_bus_message_get_member(call);
+    return std::ranges::find(_methods, member, &Method::name)->exchanges;
 }
 
 bool BusServer::isFull(platform::UserId user) const {

@@ -1,4 +1,5 @@
-// BusServer: one method, `a{sv}` in and `a{sv}` out, of the hints service's object on a bus.
+// BusServer: methods, `a{sv}` in and `a{sv}` out, of one interface of the hints service's object on
+// a bus.
 //
 // Who calls is asked of the bus. Answers may come in any order and at any time; a caller that has
 // left gets none, and a call that wants none is passed over. There is a bound on the requests that
@@ -15,10 +16,10 @@
 
 #include <systemd/sd-bus.h>
 
-#include <array>
 #include <cstddef>
 #include <map>
 #include <memory>
+#include <vector>
 
 #include "platform/linux/sd_bus_handles.h"
 #include "services/hints/bus_caller.h"
@@ -33,12 +34,17 @@ public:
     // 512 things.
     static constexpr std::size_t kMostWaiting = 384;
 
+    struct Method {
+        const char* name;
+        Exchanges& exchanges;
+    };
+
     // The names are literals.
-    BusServer(sd_bus* bus, const char* interface, const char* method, Exchanges& exchanges);
+    BusServer(sd_bus* bus, const char* interface, std::vector<Method> methods);
     BusServer(const BusServer&) = delete;
     BusServer& operator=(const BusServer&) = delete;
 
-    // Puts the method on the bus. False when the bus does not take it.
+    // Puts the methods on the bus. False when the bus does not take it.
     bool start();
 
 private:
@@ -49,13 +55,14 @@ private:
 
     static int onCall(sd_bus_message* call, void* self, sd_bus_error* error);
     void receive(sd_bus_message* call);
+    Exchanges& exchangesFor(sd_bus_message* call) const;
     bool isFull(platform::UserId user) const;
     void send(sd_bus_message* call, const platform::Message& content);
 
     sd_bus* _bus;
     const char* _interface;
-    Exchanges& _exchanges;
-    std::array<sd_bus_vtable, 3> _members;
+    const std::vector<Method> _methods;
+    std::vector<sd_bus_vtable> _members;
     platform::SdBusSlot _slot;
     KnownCallers _callers;
 

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <chrono>
-#include <functional>
 #include <utility>
 
 #include "platform/console_sessions.h"
@@ -10,6 +9,7 @@
 #include "platform/text.h"
 #include "services/hints/bus_call.h"
 #include "services/hints/hints_log.h"
+#include "services/hints/late_question.h"
 #include "services/hints/pinentry.h"
 #include "services/hints/pinentry_program.h"
 #include "services/hints/prompter_messages.h"
@@ -58,29 +58,6 @@ constexpr const char* kNowhere =
     "with the request";
 constexpr const char* kEnding = "the service was about to end after a quiet time. Try again";
 
-// A question that is asked when the user's instance has registered, or its time for that is over.
-class LateQuestion final : public PinPrompt::Question {
-public:
-    using Ask = std::function<std::unique_ptr<PinPrompt::Question>()>;
-
-    LateQuestion(sd_event* event, PrompterRegistry& prompters, platform::UserId user, Ask ask)
-        : _ask(std::move(ask)),
-          _registered(prompters.callWhenRegistered(user, [this] { askNow(); })),
-          _timeOver(callAfter(event, prompters.timeLeftToRegister(), [this] { askNow(); })) {}
-
-private:
-    void askNow() {
-        _registered.reset();
-        _timeOver.reset();
-        _question = std::exchange(_ask, nullptr)();
-    }
-
-    Ask _ask;
-    PrompterRegistry::Waiting _registered;
-    EventSource _timeOver;
-    std::unique_ptr<PinPrompt::Question> _question;
-};
-
 // The first one counts. Root at the console is nobody: no desktop is asked on root's behalf there.
 std::optional<platform::UserId> userAtConsole() {
     const auto sessions = platform::current().consoleSessions().sessions();
@@ -106,10 +83,10 @@ std::unique_ptr<PinPrompt::Question> CallerPinPrompt::ask(const PinQuestion& que
     if (!user || _prompters.prompterOf(*user) || _prompters.timeLeftToRegister() == 0ms)
         return askElsewhere(user, question, std::move(answer));
     kLog.info("waiting for the hints service of user {} to register", *user);
-    return std::make_unique<LateQuestion>(_event, _prompters, *user,
-                                          [this, user, question, answer = std::move(answer)] {
-                                              return askElsewhere(user, question, answer);
-                                          });
+    return std::make_unique<LateQuestion<Question>>(
+        _event, _prompters, *user, [this, user, question, answer = std::move(answer)] {
+            return askElsewhere(user, question, answer);
+        });
 }
 
 std::unique_ptr<PinPrompt::Question> CallerPinPrompt::askElsewhere(
@@ -124,7 +101,7 @@ std::unique_ptr<PinPrompt::Question> CallerPinPrompt::askHere(std::optional<Term
                                                               const PinQuestion& question,
                                                               Answer answer) {
     return Pinentry::start(_event, pinentryFor(question.caller, _namedPinentry),
-                           std::move(terminal), question, std::move(answer));
+                           std::move(terminal), pinForm(question), std::move(answer));
 }
 
 }  // namespace vlm::service

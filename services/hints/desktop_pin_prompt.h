@@ -16,8 +16,8 @@ public:
         : _event(event), _namedPinentry(std::move(namedPinentry)) {}
 
     std::unique_ptr<Question> ask(const PinQuestion& question, Answer answer) override {
-        return Pinentry::start(_event, pinentryOnDesktop(_namedPinentry), std::nullopt, question,
-                               std::move(answer));
+        return Pinentry::start(_event, pinentryOnDesktop(_namedPinentry), std::nullopt,
+                               pinForm(question), std::move(answer));
     }
 
 private:

@@ -31,10 +31,12 @@ std::string triesLeft(PinState state) {
 
 }  // namespace
 
-Login::Login(const LoginParts& parts, Caller caller, Request request, Done done)
+Login::Login(const LoginParts& parts, Caller caller, Request request,
+             std::optional<OpenRequest> open, Done done)
     : _parts(parts),
       _caller(std::move(caller)),
       _request(std::move(request)),
+      _open(std::move(open)),
       _done(std::move(done)) {}
 
 void Login::start() {
@@ -62,6 +64,8 @@ void Login::choose(const std::vector<Token>& tokens) {
     if (!_token.needsLogin) return prove({});
     if (_request.pin) return prove(std::move(*_request.pin));
     if (_token.hasPinPad) return prove({});
+    if (_request.operation == Operation::CardLogin)
+        return refuse(status::kNoPin, "the card wants a PIN.");
     askForPin();
 }
 
@@ -97,7 +101,7 @@ void Login::prove(Secret pin) {
         return refuse(status::kCardFailed,
                       "the system has no random numbers to challenge it with.");
     _challenge = std::move(*challenge);
-    _parts.tokens.prove({_token.identifier, _identity.publicKeyHash, _challenge, std::move(pin)},
+    _parts.tokens.prove({_token.identifier, _identity.publicKeyHash, _challenge, std::move(pin), _open},
                         [weak = weak_from_this()](const Proof& proof) {
                             if (const auto self = weak.lock()) self->judge(proof);
                         });
@@ -130,7 +134,7 @@ void Login::judge(const Proof& proof) {
                        proof.signature))
         return refuse(status::kNotProved,
                       "the card's signature is not by this key. Do not trust this card.");
-    std::exchange(_done, nullptr)(std::nullopt);
+    std::exchange(_done, nullptr)(Proved{proof.opened, proof.whyNotOpened});
 }
 
 // A person knows the names, once they are known here.

@@ -2,7 +2,8 @@
 //
 // The card is looked up, the PIN is taken from the request or asked for, the card signs a fresh
 // challenge, and the signature is verified with the public key whose hash was asked for. A PIN is
-// given to the card once, whatever becomes of it.
+// given to the card once, whatever becomes of it. Who logs in an account has asked for the PIN
+// already, so nobody is asked for that.
 //
 // Ownership: by a shared pointer; what comes in for a login that was dropped has no effect, and
 //            dropping one withdraws its PIN prompt.
@@ -43,10 +44,17 @@ struct LoginParts {
 
 class Login : public std::enable_shared_from_this<Login> {
 public:
-    using Done = std::function<void(std::optional<Refusal>)>;
+    // What the card opened besides; none when nothing was asked, or why not.
+    struct Proved {
+        std::shared_ptr<const Secret> opened;
+        std::string whyNotOpened;
+    };
+    using Done = std::function<void(Outcome<Proved>)>;
 
-    // The request is one for a login. `done` is called once, never before start() has returned.
-    Login(const LoginParts& parts, Caller caller, Request request, Done done);
+    // The request is one for a login, or for the login of an account. `done` is called once, never
+    // before start() has returned.
+    Login(const LoginParts& parts, Caller caller, Request request, std::optional<OpenRequest> open,
+          Done done);
 
     void start();
 
@@ -62,6 +70,7 @@ private:
     const LoginParts& _parts;
     const Caller _caller;
     Request _request;
+    const std::optional<OpenRequest> _open;
     Done _done;
 
     Token _token;

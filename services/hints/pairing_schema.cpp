@@ -26,6 +26,17 @@ constexpr std::array kSteps = {
            UNIQUE (account, hash)
        );
        CREATE INDEX pairing_by_hash ON pairing (hash);)",
+    // An unlock key goes with its pairing.
+    R"(CREATE TABLE unlock_key (
+           account TEXT NOT NULL,
+           hash BLOB NOT NULL,
+           wrap_hash BLOB NOT NULL CHECK (typeof(wrap_hash) = 'blob' AND length(wrap_hash) = 32),
+           wrap_public_info BLOB NOT NULL
+               CHECK (typeof(wrap_public_info) = 'blob' AND length(wrap_public_info) > 0),
+           wrapped BLOB NOT NULL CHECK (typeof(wrapped) = 'blob' AND length(wrapped) > 0),
+           PRIMARY KEY (account, hash),
+           FOREIGN KEY (account, hash) REFERENCES pairing (account, hash) ON DELETE CASCADE
+       ) WITHOUT ROWID;)",
 };
 
 constexpr const char* kOthers =

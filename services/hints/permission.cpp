@@ -18,7 +18,13 @@ bool concernsCaller(const Caller& caller, const Request& request) {
         case Operation::Unpair:
         case Operation::Pairings:
         case Operation::IsPaired:
+        case Operation::FindLoginCard:
+        case Operation::CardLogin:
+        case Operation::EraseUnlockKey:
+        case Operation::PasswordChanged:
             return platform::current().accounts().userId(request.account) == caller.user;
+        case Operation::SessionLogin:
+            return false;
         default:
             return request.user == platform::kNobody || request.user == caller.user;
     }

@@ -15,10 +15,6 @@ namespace {
 
 using namespace std::chrono_literals;
 
-// The program keeps the time itself, for the warning and for the PIN; this is for one that does
-// not.
-constexpr auto kPatience = 2 * std::chrono::seconds(PinentryDialog::kPatienceSeconds) + 10s;
-
 // How long a program may take to put its window away.
 constexpr auto kFarewell = 1s;
 
@@ -27,12 +23,14 @@ constexpr std::size_t kMostSaid = std::size_t{64} << 10U;
 
 }  // namespace
 
-Pinentry::Pinentry(sd_event* event, std::optional<Terminal> terminal, const PinQuestion& question,
+Pinentry::Pinentry(sd_event* event, std::optional<Terminal> terminal, const PinentryForm& form,
                    PinPrompt::Answer answer)
     : _event(event),
-      _dialog(question, terminal
-                            ? std::optional(PinentryTerminal{terminal->path(), terminal->type()})
-                            : std::nullopt),
+      // The program keeps the time itself, for the warning and for the rest; this is for one that
+      // does not.
+      _patience(2 * form.patience + 10s),
+      _dialog(form, terminal ? std::optional(PinentryTerminal{terminal->path(), terminal->type()})
+                             : std::nullopt),
       _answer(std::move(answer)),
       _terminal(std::move(terminal)) {}
 
@@ -45,9 +43,9 @@ Pinentry::~Pinentry() {
 
 std::unique_ptr<Pinentry> Pinentry::start(sd_event* event, const ProgramToRun& program,
                                           std::optional<Terminal> terminal,
-                                          const PinQuestion& question, PinPrompt::Answer answer) {
+                                          const PinentryForm& form, PinPrompt::Answer answer) {
     std::unique_ptr<Pinentry> pinentry(
-        new Pinentry(event, std::move(terminal), question, std::move(answer)));
+        new Pinentry(event, std::move(terminal), form, std::move(answer)));
     if (const auto reason = pinentry->run(program))
         pinentry->_time =
             callSoon(event, [self = pinentry.get(), why = *reason] { self->breakOff(why); });
@@ -60,7 +58,7 @@ std::optional<std::string> Pinentry::run(const ProgramToRun& program) {
     _program = std::move(*started);
     _readable = callWhenReadable(_event, _program->socket(), [this] { read(); });
     _time =
-        callAfter(_event, kPatience, [this] { breakOff("the pinentry program does not answer"); });
+        callAfter(_event, _patience, [this] { breakOff("the pinentry program does not answer"); });
     if (!_readable || !_time) return "the event loop has no room for it";
     return std::nullopt;
 }

@@ -1,4 +1,4 @@
-// Pinentry: one run of a pinentry program that asks a person for a PIN.
+// Pinentry: one run of a pinentry program that asks a person for a PIN or a password.
 //
 // The answer comes when the program has ended, so that the terminal is the person's again.
 //
@@ -10,6 +10,7 @@
 #pragma once
 
 #include <array>
+#include <chrono>
 #include <cstddef>
 #include <memory>
 #include <optional>
@@ -27,14 +28,14 @@ public:
     // Without a terminal the program asks on a desktop, which it finds in its environment.
     static std::unique_ptr<Pinentry> start(sd_event* event, const ProgramToRun& program,
                                            std::optional<Terminal> terminal,
-                                           const PinQuestion& question, PinPrompt::Answer answer);
+                                           const PinentryForm& form, PinPrompt::Answer answer);
 
     Pinentry(const Pinentry&) = delete;
     Pinentry& operator=(const Pinentry&) = delete;
     ~Pinentry() override;
 
 private:
-    Pinentry(sd_event* event, std::optional<Terminal> terminal, const PinQuestion& question,
+    Pinentry(sd_event* event, std::optional<Terminal> terminal, const PinentryForm& form,
              PinPrompt::Answer answer);
 
     // Why the program does not run; none when it does.
@@ -47,6 +48,7 @@ private:
     void finish();
 
     sd_event* _event;
+    const std::chrono::seconds _patience;
     PinentryDialog _dialog;
     PinPrompt::Answer _answer;
     std::optional<Terminal> _terminal;

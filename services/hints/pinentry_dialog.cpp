@@ -1,5 +1,6 @@
 #include "services/hints/pinentry_dialog.h"
 
+#include <algorithm>
 #include <charconv>
 #include <utility>
 
@@ -9,10 +10,6 @@
 namespace vlm::service {
 
 namespace {
-
-// The protocol allows lines of 1000 bytes; this many characters of a name fit beside the rest.
-constexpr std::size_t kMostNameCharacters = 64;
-constexpr std::size_t kMostAccountCharacters = 32;
 
 constexpr const char* kConfirm = "CONFIRM";
 constexpr const char* kGetPin = "GETPIN";
@@ -39,43 +36,6 @@ std::string escaped(std::string_view text) {
     return line;
 }
 
-std::string shownCard(const PinQuestion& question) {
-    return platform::harmlessText(question.card, kMostNameCharacters);
-}
-
-std::string_view warning(PinState state) {
-    switch (state) {
-        case PinState::FewTriesLeft:
-            return "\n\nA wrong PIN was entered before, and only a few tries are left.";
-        case PinState::LastTry:
-            return "\n\nThis is the last try: after another wrong PIN the card is locked.";
-        case PinState::Ready:
-        case PinState::Locked:
-            break;
-    }
-    return {};
-}
-
-std::string description(const PinQuestion& question) {
-    const auto whose =
-        question.account.empty()
-            ? std::string("an account")
-            : "the account " + platform::harmlessText(question.account, kMostAccountCharacters);
-    return platform::text(
-        "Enter the PIN of the card \"{}\". The card then proves that it holds the identity "
-        "\"{}\", so that it can be paired with {}.{}",
-        shownCard(question), platform::harmlessText(question.identity, kMostNameCharacters), whose,
-        warning(question.state));
-}
-
-std::string lastTryWarning(const PinQuestion& question) {
-    return platform::text(
-        "The PIN of the card \"{}\" was entered wrongly before, and only one try is left. After "
-        "another wrong PIN the card is locked, and whoever issued it has to unlock it.\n\nDo you "
-        "know the PIN for certain, and want to enter it?",
-        shownCard(question));
-}
-
 // One word of a line, taken off its head.
 std::string_view takeWord(std::string_view& line) {
     const auto end = std::min(line.find(' '), line.size());
@@ -93,35 +53,41 @@ int hexadecimalDigit(char digit) {
 
 }  // namespace
 
-PinentryDialog::PinentryDialog(const PinQuestion& question,
-                               const std::optional<PinentryTerminal>& terminal) {
+PinentryDialog::PinentryDialog(const PinentryForm& form,
+                               const std::optional<PinentryTerminal>& terminal)
+    : _mostBytes(std::min(form.mostBytes, _typed.size())), _asksTwice(!form.repeatPrompt.empty()) {
     if (terminal) {
         _commands.push_back("OPTION ttyname=" + escaped(terminal->path));
         _commands.push_back("OPTION ttytype=" + escaped(terminal->type));
     }
     _commands.push_back("OPTION lc-ctype=C.UTF-8");
-    _commands.push_back(platform::text("SETTIMEOUT {}", kPatienceSeconds));
-    _commands.push_back("SETTITLE Smart card");
-    if (question.state == PinState::LastTry) {
-        _commands.push_back("SETDESC " + escaped(lastTryWarning(question)));
+    _commands.push_back(platform::text("SETTIMEOUT {}", form.patience.count()));
+    _commands.push_back("SETTITLE " + escaped(form.title));
+    if (!form.warning.empty()) {
+        _commands.push_back("SETDESC " + escaped(form.warning));
         _commands.emplace_back(kConfirm);
     }
-    _commands.push_back("SETDESC " + escaped(description(question)));
-    _commands.push_back("SETPROMPT PIN:");
+    _commands.push_back("SETDESC " + escaped(form.description));
+    _commands.push_back("SETPROMPT " + escaped(form.prompt));
+    if (!form.error.empty()) _commands.push_back("SETERROR " + escaped(form.error));
+    if (_asksTwice) {
+        _commands.push_back("SETREPEAT " + escaped(form.repeatPrompt));
+        _commands.emplace_back("SETREPEATERROR The two differ. Try again.");
+    }
     _commands.emplace_back(kGetPin);
 }
 
-PinentryDialog::~PinentryDialog() { wipeMemory(_pin); }
+PinentryDialog::~PinentryDialog() { wipeMemory(_typed); }
 
 std::string PinentryDialog::take(std::string_view line) {
     if (_isOver) return {};
     const auto word = takeWord(line);
     const bool isAsked = _sent == _commands.size();
     if (word == "D" && isAsked) collect(line);
+    if (word == "S" && isAsked && line == "PIN_REPEATED") _wasRepeated = true;
     if (word == "OK") {
         if (!isAsked) return next();
-        end(_isTooLong ? PinAnswer::Outcome::Unavailable : PinAnswer::Outcome::Given,
-            "the PIN that was entered is too long");
+        endWithWhatWasTyped();
     }
     if (word == "ERR") {
         // A program that does not know an option asks all the same; but not what it must not ask
@@ -153,12 +119,19 @@ void PinentryDialog::collect(std::string_view data) {
                 at += 2;
             }
         }
-        if (_pinSize == _pin.size()) {
+        if (_typedSize == _mostBytes) {
             _isTooLong = true;
             return;
         }
-        _pin[_pinSize++] = each;
+        _typed[_typedSize++] = each;
     }
+}
+
+void PinentryDialog::endWithWhatWasTyped() {
+    if (_isTooLong) return end(PinAnswer::Outcome::Unavailable, "what was entered is too long");
+    if (_asksTwice && !_wasRepeated && _typedSize > 0)
+        return end(PinAnswer::Outcome::Unavailable, "the pinentry program does not ask twice");
+    end(PinAnswer::Outcome::Given);
 }
 
 void PinentryDialog::end(PinAnswer::Outcome outcome, std::string reason) {
@@ -167,11 +140,12 @@ void PinentryDialog::end(PinAnswer::Outcome outcome, std::string reason) {
     _answer.reason = std::move(reason);
     if (outcome != PinAnswer::Outcome::Given) return;
     _answer.reason.clear();
-    // Nothing was typed: no card has such a PIN, and for a card it means that its reader asks.
-    if (_pinSize == 0)
+    // Nothing was typed: no card has such a PIN, and for a card it means that its reader asks; and
+    // no keyring that is shut has such a password.
+    if (_typedSize == 0)
         _answer.outcome = PinAnswer::Outcome::Cancelled;
     else
-        _answer.pin = Secret(std::string_view(_pin.data(), _pinSize));
+        _answer.pin = Secret(std::string_view(_typed.data(), _typedSize));
 }
 
 void PinentryDialog::endWithError(std::string_view error) {

@@ -1,8 +1,8 @@
 // PinentryDialog: our side of the conversation with a pinentry program, line by line (the Assuan
 // protocol: commands answered by "OK", "ERR number text" or "D data" before them).
 //
-// Before a last try the person is warned, and has to say yes, before the PIN is asked for. What the
-// program says is bounded, and what it says of the PIN is wiped.
+// Where there is a warning, the person has to say yes to it before anything is asked for. What the
+// program says is bounded, and what it says of the secret is wiped.
 //
 // Threads: one. Errors: an answer with the reason.
 // In tests: tests/unit/services/pinentry_dialog_test.cpp
@@ -16,6 +16,7 @@
 #include <vector>
 
 #include "services/hints/pin_prompt.h"
+#include "services/hints/pinentry_form.h"
 
 namespace vlm::service {
 
@@ -26,11 +27,8 @@ struct PinentryTerminal {
 
 class PinentryDialog {
 public:
-    // A person who is away is not waited for longer, each time that something is asked.
-    static constexpr int kPatienceSeconds = 120;
-
     // Without a terminal the program asks on a desktop.
-    PinentryDialog(const PinQuestion& question, const std::optional<PinentryTerminal>& terminal);
+    PinentryDialog(const PinentryForm& form, const std::optional<PinentryTerminal>& terminal);
     PinentryDialog(const PinentryDialog&) = delete;
     PinentryDialog& operator=(const PinentryDialog&) = delete;
     ~PinentryDialog();
@@ -49,6 +47,7 @@ public:
 private:
     std::string next();
     void collect(std::string_view data);
+    void endWithWhatWasTyped();
     void end(PinAnswer::Outcome outcome, std::string reason = {});
     void endWithError(std::string_view error);
 
@@ -58,8 +57,11 @@ private:
     bool _isTooLong = false;
     PinAnswer _answer;
 
-    std::array<char, 256> _pin = {};
-    std::size_t _pinSize = 0;
+    std::array<char, 1024> _typed = {};
+    std::size_t _typedSize = 0;
+    const std::size_t _mostBytes;
+    const bool _asksTwice;
+    bool _wasRepeated = false;
 };
 
 }  // namespace vlm::service

@@ -29,17 +29,32 @@ enum class Operation : std::uint64_t {
     UnlockKeybag = 5,
     IsPaired = 6,
     TokenEndpoints = 7,
+    NameKeyring = 8,
+    StoreUnlockKey = 9,
+    EraseUnlockKey = 10,
+    FindLoginCard = 11,
+    CardLogin = 12,
+    PasswordChanged = 13,
+    SessionLogin = 14,
 };
 
 struct Request {
     Operation operation = Operation::Login;
-    platform::UserId user = platform::kNobody;  // Login, TokenInfo, UnlockKeybag, TokenEndpoints
-    platform::Bytes hash;                       // Login, Pair, Unpair
-    std::string account;                        // Pair, Unpair, Pairings, IsPaired
-    std::string tokenIdentifier;                // Login; TokenInfo: empty for all tokens
-    std::optional<Secret> pin;                  // Login, when the caller has it
-    bool insertedOnly = false;                  // Pairings
-    bool asksWhenToLookAgain = false;           // TokenInfo
+    platform::UserId user = platform::kNobody;  // Login, TokenInfo, UnlockKeybag, TokenEndpoints,
+                                                // NameKeyring, StoreUnlockKey
+    platform::Bytes hash;  // Login, Pair, Unpair, StoreUnlockKey, EraseUnlockKey, CardLogin
+    std::string account;   // Pair, Unpair, Pairings, IsPaired, EraseUnlockKey, PasswordChanged,
+                           // CardLogin, SessionLogin; FindLoginCard: empty for whomever the
+                           // inserted cards belong to
+    std::string tokenIdentifier;       // Login, StoreUnlockKey, CardLogin, SessionLogin;
+                                       // TokenInfo: empty for all tokens
+    std::optional<Secret> pin;         // Login, CardLogin, when the caller has it
+    std::optional<Secret> password;    // UnlockKeybag, PasswordChanged: always there
+    platform::Bytes wrapKeyHash;       // StoreUnlockKey
+    std::string keyring;               // StoreUnlockKey
+    std::string session;               // SessionLogin
+    bool insertedOnly = false;         // Pairings
+    bool asksWhenToLookAgain = false;  // TokenInfo
 };
 
 Outcome<Request> readRequest(const IncomingRequest& incoming);

@@ -1,4 +1,4 @@
-// Secret: a PIN on its way from a person to a card.
+// Secret: a PIN, a password or a key on its way.
 //
 // The text lives in memory of its own that is locked (never swapped), left out of core files and
 // wiped when the secret is destroyed or moved from. It is never logged and never converted to text.
@@ -9,6 +9,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <span>
 #include <string_view>
 
@@ -31,6 +32,10 @@ public:
     // Valid as long as the secret is.
     std::string_view text() const { return {_text, _size}; }
     std::span<char> memory() { return {_text, _size}; }
+    std::span<std::uint8_t> octets() { return {reinterpret_cast<std::uint8_t*>(_text), _size}; }
+    std::span<const std::uint8_t> octets() const {
+        return {reinterpret_cast<const std::uint8_t*>(_text), _size};
+    }
     bool empty() const { return _size == 0; }
 
     // Forgets what stands behind the first `size` bytes.

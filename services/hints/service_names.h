@@ -15,7 +15,8 @@ inline constexpr const char* kHintsInterface = "org.vlm.token.hints";
 // The daemon's, for the instances that ask their users for PINs: RegisterPrompter()
 inline constexpr const char* kPromptersInterface = "org.vlm.token.hints.Prompters";
 
-// Such an instance's, for the daemon: AskPin(a{sv} question) -> a{sv} answer
+// Such an instance's, for the daemon: AskPin, NameKeyring, AskKeyringPassword, UnlockKeyring, each
+// (a{sv} question) -> a{sv} answer
 inline constexpr const char* kPrompterInterface = "org.vlm.token.hints.Prompter";
 
 // The agent's, for programs that watch tokens: Watch() -> as; signals Inserted(s) and Removed(s)

@@ -48,6 +48,7 @@ SessionTokens::SessionTokens(const Parts& parts)
       _notice({.isUserAtConsole = isUserAtConsole,
                .post = [bus = parts.bus] { postNewToken(bus, onAnswer); },
                .callAfter = callingAfter(parts.event)}),
+      _removal({.removed = parts.cardRemoved, .callAfter = callingAfter(parts.event)}),
       _lookout({.daemon = parts.daemon,
                 .callAfter = callingAfter(parts.event),
                 .inserted = [this](const std::string& token) { _watches.inserted(token); },
@@ -56,6 +57,7 @@ SessionTokens::SessionTokens(const Parts& parts)
                     [this] {
                         _watches.looked();
                         _notice.looked(_lookout.tokens(), _lookout.isCertain());
+                        _removal.looked(_lookout.tokens(), _lookout.isCertain());
                     }}),
       _cards(parts.event, [this](CardEvent event) { cardEvent(event); }),
       _console(parts.event, [this] {
@@ -64,9 +66,23 @@ SessionTokens::SessionTokens(const Parts& parts)
       }) {}
 
 void SessionTokens::cardEvent(CardEvent event) {
-    if (event == CardEvent::CardPulled) _notice.cardPulled();
-    if (event == CardEvent::PcscdWent) _notice.pcscdWent();
-    if (event == CardEvent::PcscdCame) _notice.pcscdCame();
+    switch (event) {
+        case CardEvent::CardPulled:
+            _notice.cardPulled();
+            _removal.cardMoved();
+            break;
+        case CardEvent::CardMoved:
+            _removal.cardMoved();
+            break;
+        case CardEvent::PcscdWent:
+            _notice.pcscdWent();
+            _removal.pcscdWent();
+            break;
+        case CardEvent::PcscdCame:
+            _notice.pcscdCame();
+            _removal.pcscdCame();
+            break;
+    }
     _lookout.cardEvent();
 }
 

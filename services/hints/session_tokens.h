@@ -1,5 +1,5 @@
 // SessionTokens: what the user's instance does about the tokens that come and go while the session
-// lasts: it tells the programs that watch, and the desktop's agent.
+// lasts: it tells the programs that watch, the desktop's agent, and whoever acts on a removed card.
 //
 // Ownership: its parts outlive it. Threads: the event loop's.
 // Blocking:  as bus_token_watches.h and card_events.h say.
@@ -10,8 +10,12 @@
 
 #include <systemd/sd-bus.h>
 
+#include <functional>
+#include <string>
+
 #include "services/hints/bus_token_watches.h"
 #include "services/hints/card_events.h"
+#include "services/hints/card_removal.h"
 #include "services/hints/console_watch.h"
 #include "services/hints/daemon_link.h"
 #include "services/hints/new_token_notice.h"
@@ -26,6 +30,7 @@ public:
         sd_bus* bus;
         CallerWatch& callers;
         DaemonLink& daemon;
+        std::function<void(const std::string& token)> cardRemoved;  // certainly
     };
 
     explicit SessionTokens(const Parts& parts);
@@ -40,6 +45,7 @@ private:
 
     BusTokenWatches _watches;
     NewTokenNotice _notice;
+    CardRemoval _removal;
     TokenLookout _lookout;
     CardEvents _cards;
     ConsoleWatch _console;

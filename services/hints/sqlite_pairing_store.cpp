@@ -1,12 +1,10 @@
 #include "services/hints/sqlite_pairing_store.h"
 
-#include <SQLiteCpp/Database.h>
-#include <SQLiteCpp/Statement.h>
-
 #include <filesystem>
 #include <utility>
 
 #include "platform/text.h"
+#include "services/hints/pairing_database.h"
 #include "services/hints/pairing_schema.h"
 #include "services/hints/private_file.h"
 #include "services/hints/status.h"
@@ -19,39 +17,9 @@ namespace {
 // for instance. Everybody's requests wait with it.
 constexpr int kPatienceMilliseconds = 250;
 
-Refusal failed(const char* why) {
-    return {status::kStoreFailed,
-            platform::text("The pairings could not be read or written: {}. The system log of the "
-                           "hints service may say more.",
-                           why)};
-}
-
 Refusal cannotOpen(const std::string& path, std::string_view why) {
     return {status::kStoreFailed,
             platform::text("The pairings in {} cannot be used: {}.", path, why)};
-}
-
-// A prepared statement for one use; it is ready for the next one when this goes.
-class Use {
-public:
-    explicit Use(SQLite::Statement& statement) : _statement(statement) {}
-    Use(const Use&) = delete;
-    Use& operator=(const Use&) = delete;
-    ~Use() { _statement.tryReset(); }
-
-    SQLite::Statement* operator->() { return &_statement; }
-
-    void bindHash(int index, const platform::Bytes& hash) {
-        _statement.bind(index, hash.data(), static_cast<int>(hash.size()));
-    }
-
-private:
-    SQLite::Statement& _statement;
-};
-
-platform::Bytes bytesOf(const SQLite::Column& column) {
-    const auto* first = static_cast<const std::uint8_t*>(column.getBlob());
-    return first ? platform::Bytes(first, first + column.getBytes()) : platform::Bytes();
 }
 
 std::vector<Pairing> readAll(Use& use) {
@@ -62,44 +30,7 @@ std::vector<Pairing> readAll(Use& use) {
     return pairings;
 }
 
-// What throws is caught here, at the border of the library.
-template <typename Work>
-auto guarded(Work work) -> Outcome<decltype(work())> {
-    try {
-        return work();
-    } catch (const std::exception& error) {
-        return failed(error.what());
-    }
-}
-
 }  // namespace
-
-// The connection and what is prepared on it, in the order of their making.
-struct SqlitePairingStore::Database {
-    explicit Database(SQLite::Database opened)
-        : connection(std::move(opened)),
-          pair(connection,
-               "INSERT OR REPLACE INTO pairing (account, hash, paired_at) VALUES (?, ?, ?)"),
-          unpair(connection, "DELETE FROM pairing WHERE account = ? AND hash = ?"),
-          ofAccount(connection,
-                    "SELECT account, hash, sequence, paired_at FROM pairing "
-                    "WHERE account = ? ORDER BY sequence DESC"),
-          withHash(connection,
-                   "SELECT account, hash, sequence, paired_at FROM pairing "
-                   "WHERE hash = ? ORDER BY sequence DESC"),
-          all(connection,
-              "SELECT account, hash, sequence, paired_at FROM pairing "
-              "ORDER BY account, sequence DESC"),
-          anyOf(connection, "SELECT 1 FROM pairing WHERE account = ? LIMIT 1") {}
-
-    SQLite::Database connection;
-    SQLite::Statement pair;
-    SQLite::Statement unpair;
-    SQLite::Statement ofAccount;
-    SQLite::Statement withHash;
-    SQLite::Statement all;
-    SQLite::Statement anyOf;
-};
 
 SqlitePairingStore::SqlitePairingStore(std::unique_ptr<Database> database)
     : _database(std::move(database)) {}
@@ -115,6 +46,7 @@ Outcome<std::unique_ptr<SqlitePairingStore>> SqlitePairingStore::open(const std:
         if (database.execAndGet("PRAGMA journal_mode = WAL").getString() != "wal")
             return cannotOpen(path, "its file system does not allow a write-ahead log");
         database.exec("PRAGMA synchronous = FULL");
+        database.exec("PRAGMA foreign_keys = ON");
         return std::unique_ptr<SqlitePairingStore>(
             new SqlitePairingStore(std::make_unique<Database>(std::move(database))));
     } catch (const std::exception& error) {
@@ -148,7 +80,7 @@ std::optional<Refusal> SqlitePairingStore::pair(const std::string& account,
     const auto done = guarded([&] {
         Use use(_database->pair);
         use->bind(1, account);
-        use.bindHash(2, hash);
+        use.bindBytes(2, hash);
         use->bind(3, now);
         return use->exec();
     });
@@ -159,7 +91,7 @@ Outcome<bool> SqlitePairingStore::unpair(const std::string& account, const platf
     return guarded([&] {
         Use use(_database->unpair);
         use->bind(1, account);
-        use.bindHash(2, hash);
+        use.bindBytes(2, hash);
         return use->exec() > 0;
     });
 }
@@ -175,7 +107,7 @@ Outcome<std::vector<Pairing>> SqlitePairingStore::pairingsOf(const std::string& 
 Outcome<std::vector<Pairing>> SqlitePairingStore::pairingsWith(const platform::Bytes& hash) {
     return guarded([&] {
         Use use(_database->withHash);
-        use.bindHash(1, hash);
+        use.bindBytes(1, hash);
         return readAll(use);
     });
 }

@@ -1,4 +1,4 @@
-// SqlitePairingStore: the pairings in a database file.
+// SqlitePairingStore: the pairings in a database file, and the unlock keys beside them.
 //
 // Write-ahead log with full synchronisation: a pairing survives a power cut once pair() returned.
 // The statements are prepared once.
@@ -9,10 +9,11 @@
 #include <string>
 
 #include "services/hints/pairing_store.h"
+#include "services/hints/unlock_key_store.h"
 
 namespace vlm::service {
 
-class SqlitePairingStore final : public PairingStore {
+class SqlitePairingStore final : public PairingStore, public UnlockKeyStore {
 public:
     static constexpr const char* kUsualPath = "/var/lib/vlm/hints.sqlite3";
 
@@ -22,7 +23,7 @@ public:
     static Outcome<std::unique_ptr<SqlitePairingStore>> open(const std::string& path);
 
     // Opens a database that is there, to read it only: for a program beside the service. It is
-    // never made, never migrated, and pair() and unpair() are refused. The library that reads it
+    // never made, never migrated, and what would change it is refused. The library that reads it
     // may leave its own empty files beside it, which the service clears away.
     static Outcome<std::unique_ptr<SqlitePairingStore>> openToRead(const std::string& path);
 
@@ -34,6 +35,13 @@ public:
     Outcome<std::vector<Pairing>> pairingsOf(const std::string& account) override;
     Outcome<std::vector<Pairing>> pairingsWith(const platform::Bytes& hash) override;
     Outcome<bool> isPaired(const std::string& account) override;
+
+    std::optional<Refusal> storeUnlockKey(const UnlockKey& key) override;
+    std::optional<Refusal> storeUnlockKeys(const std::vector<UnlockKey>& keys) override;
+    Outcome<std::optional<UnlockKey>> unlockKey(const std::string& account,
+                                                const platform::Bytes& hash) override;
+    Outcome<std::vector<UnlockKey>> unlockKeysOf(const std::string& account) override;
+    Outcome<bool> eraseUnlockKey(const std::string& account, const platform::Bytes& hash) override;
 
     // Everybody's, account by account, the latest of each first.
     Outcome<std::vector<Pairing>> allPairings();

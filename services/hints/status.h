@@ -28,5 +28,12 @@ inline constexpr Status kUnreachable = -2014;   // the daemon does not answer th
 inline constexpr Status kBusy = -2015;          // too many requests wait for an answer already
 inline constexpr Status kUnattended = -2016;    // nobody can be asked in the caller's session
 inline constexpr Status kRightUnknown = -2017;  // whether an administrator allows it is not known
+inline constexpr Status kNoLoginCard = -2018;   // no card to log in with; the password is asked for
+inline constexpr Status kCardRequired = -2019;  // likewise, and no other login is allowed
+inline constexpr Status kCertificateRefused = -2020;  // expired, not yet valid or not trusted
+inline constexpr Status kNoKeyring = -2021;           // no login keyring, or nobody there to ask
+inline constexpr Status kKeyringRefused = -2022;      // the keyring did not take the password
+inline constexpr Status kNoWrapKey = -2023;           // the card has no key that can wrap
+inline constexpr Status kUnlockKeyShut = -2024;       // only told: the login itself is good
 
 }  // namespace vlm::service::status

@@ -1,5 +1,6 @@
 #include <sys/random.h>
 #include <systemd/sd-daemon.h>
+#include <systemd/sd-login.h>
 
 #include <chrono>
 #include <filesystem>
@@ -8,19 +9,24 @@
 #include "services/hints/bus_caller_watch.h"
 #include "services/hints/bus_connection.h"
 #include "services/hints/bus_server.h"
+#include "services/hints/bus_user_keyrings.h"
 #include "services/hints/caller_pin_prompt.h"
+#include "services/hints/certificate_trust.h"
 #include "services/hints/counted_work.h"
 #include "services/hints/hints_log.h"
 #include "services/hints/hints_service.h"
 #include "services/hints/idleness.h"
 #include "services/hints/instances.h"
+#include "services/hints/judged_tokens.h"
 #include "services/hints/logind_caller_sessions.h"
 #include "services/hints/polkit_authority.h"
 #include "services/hints/prompter_registry.h"
 #include "services/hints/service_names.h"
 #include "services/hints/sqlite_pairing_store.h"
 #include "services/hints/tokens/signature.h"
+#include "services/hints/tokens/worker_anchors.h"
 #include "services/hints/tokens/worker_tokens.h"
+#include "settings/smartcard_settings_worker.h"
 
 namespace vlm::service {
 
@@ -35,6 +41,13 @@ std::optional<Bytes> randomBytes(std::size_t size) {
 std::int64_t secondsNow() {
     const auto since = std::chrono::system_clock::now().time_since_epoch();
     return std::chrono::duration_cast<std::chrono::seconds>(since).count();
+}
+
+bool isTrustChecked() { return resolveSetting("checkCertificateTrust").value != 0; }
+
+bool isSession(const std::string& name) {
+    uid_t user = 0;
+    return sd_session_get_uid(name.c_str(), &user) >= 0;
 }
 
 std::int64_t milliseconds() {
@@ -72,13 +85,14 @@ Idleness::Parts idlenessOf(sd_event* event, const Options& options, const Proofs
 
 // Whoever asks from now on starts the service anew; what came before is still answered. A question
 // to a person would keep the new one waiting for as long as that person takes.
-void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt, PolkitAuthority& polkit,
-           Idleness& idleness) {
+void leave(ServiceLoop& loop, BusConnection& bus, CallerPinPrompt& prompt,
+           BusUserKeyrings& keyrings, PolkitAuthority& polkit, Idleness& idleness) {
     kLog.info("leaving after a quiet time");
     // First, so that systemd neither ends this process for the loss of its name nor takes it for
     // the one that serves.
     sd_notify(0, "STOPPING=1");
     prompt.askNobody();
+    keyrings.askNobody();
     polkit.askNobody();
     bus.release([&] { idleness.callWhenDone([&] { loop.end(); }); });
 }
@@ -97,21 +111,29 @@ InstanceEnd runSystemInstance(ServiceLoop& loop, const Options& options) {
     PrompterRegistry prompters(connection, callers, milliseconds);
     Proofs proofs(milliseconds);
     Idleness idleness(idlenessOf(loop.get(), options, proofs));
-    WorkerTokens cards(loop.get(), workersFor(options));
-    CountedTokens tokens(cards, idleness);
+    const auto workers = workersFor(options);
+    WorkerTokens cards(loop.get(), workers);
+    WorkerAnchors anchors(loop.get(), workers);
+    CertificateTrust trust;
+    JudgedTokens judged({cards, anchors, trust, isTrustChecked, secondsNow});
+    CountedTokens tokens(judged, idleness);
     CallerPinPrompt prompt(loop.get(), prompters, options.pinentry);
+    BusUserKeyrings keyrings(loop.get(), prompters, {});
     LogindCallerSessions sessions(connection);
     PolkitAuthority polkit(connection);
     AdministratorRight right(polkit);
+    const SessionCards sessionCards;
     HintsService service({.login = {tokens, prompt, verifySignature, randomBytes},
                           .changes = {tokens, **pairings, proofs, sessions, right, secondsNow},
+                          .unlockKeys = {tokens, **pairings, **pairings, keyrings},
+                          .sessionLogin = {sessionCards, isSession},
                           .callers = callers});
     CountedExchanges requests(service, idleness);
-    BusServer server(connection, kHintsInterface, "Exchange", requests);
+    BusServer server(connection, kHintsInterface, {{"Exchange", requests}});
 
     if (!server.start() || !prompters.start()) return {"the bus does not take the service"};
     if (auto reason = (*bus)->claim(kDaemonName); !reason.empty()) return {reason};
-    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, polkit, idleness); });
+    idleness.callWhenIdle([&] { leave(loop, **bus, prompt, keyrings, polkit, idleness); });
     return {{}, loop.run()};
 }
 

@@ -9,9 +9,14 @@ namespace {
 
 using platform::PropertyList;
 
-// Whether login would accept the identity now.
+// Whether the identity may be offered for a pairing now.
 bool isUsable(const Identity& identity, std::int64_t now) {
     return identity.canSign && identity.validAt(now);
+}
+
+// Whether login would accept it, too.
+bool isGoodForLogin(const Identity& identity, std::int64_t now) {
+    return isUsable(identity, now) && identity.distrust.empty();
 }
 
 const std::vector<Pairing>& pairingsWith(const Bytes& hash, const PairingsByHash& pairings) {
@@ -27,7 +32,7 @@ std::map<std::string, Pairing> chooseForAuthentication(const std::vector<Token>&
     std::map<std::string, Pairing> chosen;
     for (const auto& token : inserted) {
         for (const auto& identity : token.identities) {
-            if (!isUsable(identity, now)) continue;
+            if (!isGoodForLogin(identity, now)) continue;
             for (const auto& pairing : pairingsWith(identity.publicKeyHash, pairings)) {
                 auto& latest = chosen[pairing.account];
                 if (latest.sequence < pairing.sequence) latest = pairing;

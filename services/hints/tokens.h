@@ -38,6 +38,11 @@ struct Identity {
     std::int64_t notBefore = 0;  // seconds since 1970-01-01 00:00:00 UTC
     std::int64_t notAfter = 0;
     bool canSign = false;  // key and certificate both allow signatures
+    Bytes certificate;     // in DER; empty when it is too large to be told
+
+    // Why nobody may log in with it, where the machine checks whom it trusts: a clause for people.
+    // Empty when it may be used, and where nothing is checked.
+    std::string distrust;
 
     bool validAt(std::int64_t seconds) const { return notBefore <= seconds && seconds <= notAfter; }
     bool operator==(const Identity&) const = default;
@@ -60,6 +65,9 @@ struct Token {
     bool needsLogin = true;
     PinState pinState = PinState::Ready;
     std::vector<Identity> identities;  // sorted by hash, each hash once
+    // The certificates without a key here, in DER: of issuers, as a rule. Some are left out where
+    // there are many.
+    std::vector<Bytes> otherCertificates;
     // The identity whose key can wrap: an RSA key that may decrypt, or an EC key that may derive.
     std::optional<Bytes> wrapKeyHash;
     WrapScheme wrapScheme = WrapScheme::RsaOaepSha256;  // the best that this key and card can do

@@ -6,7 +6,7 @@
 // Blocking:  for the disk only; what was stored is on disk when the call returns.
 // Errors:    status kStoreFailed with a text; kNotPaired for a pairing that is not there.
 // Behind it: services/hints/sqlite_pairing_store.h
-// In tests:  tests/fakes/fake_pairing_store.h
+// In tests:  tests/fakes/fake_pairing_store.h, tests/integration/service/unlock_key_store_test.cpp
 
 #pragma once
 
@@ -35,6 +35,9 @@ public:
 
     // Replaces the one that is there.
     virtual std::optional<Refusal> storeUnlockKey(const UnlockKey& key) = 0;
+
+    // All of them, or none.
+    virtual std::optional<Refusal> storeUnlockKeys(const std::vector<UnlockKey>& keys) = 0;
 
     virtual Outcome<std::optional<UnlockKey>> unlockKey(const std::string& account,
                                                         const platform::Bytes& hash) = 0;

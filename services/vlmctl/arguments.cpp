@@ -19,7 +19,7 @@ Look at and set what rules the smart cards of this machine.
 Settings:
   settings             list every setting, its value and where that comes from
   get KEY              print the value of a setting
-  set KEY VALUE        switch a setting on or off for this machine; root only
+  set KEY VALUE        set a setting for this machine, as in "on"; root only
   unset KEY            remove a setting from this machine's record; root only
   check FILE           tell what is wrong in a property list; "-" is standard input
 

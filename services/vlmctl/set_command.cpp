@@ -4,6 +4,7 @@
 #include <array>
 #include <cctype>
 #include <optional>
+#include <span>
 #include <string>
 
 #include "platform/platform.h"
@@ -35,13 +36,40 @@ constexpr std::array kWords = {
     Word{"false", false}, Word{"no", false}, Word{"off", false}, Word{"0", false},
 };
 
-std::optional<bool> switchOf(std::string word) {
+std::string inLowerCase(std::string word) {
     std::ranges::transform(word, word.begin(), [](unsigned char letter) {
         return static_cast<char>(std::tolower(letter));
     });
+    return word;
+}
+
+std::optional<PropertyList> switchOf(const std::string& word) {
     const auto found = std::ranges::find(kWords, word, &Word::name);
     if (found == kWords.end()) return std::nullopt;
-    return found->value;
+    return PropertyList(found->value);
+}
+
+// The number of one of the choices, by its name or as it is.
+std::optional<PropertyList> choiceOf(std::span<const std::string_view> choices,
+                                     const std::string& word) {
+    for (std::size_t number = 0; number < choices.size(); ++number)
+        if (word == choices[number] || word == std::to_string(number))
+            return PropertyList(static_cast<std::int64_t>(number));
+    return std::nullopt;
+}
+
+std::optional<PropertyList> valueFor(const KnownSetting& setting, const std::string& word) {
+    return setting.choices.empty() ? switchOf(inLowerCase(word))
+                                   : choiceOf(setting.choices, inLowerCase(word));
+}
+
+std::string notAValue(const KnownSetting& setting, const std::string& word) {
+    if (setting.choices.empty())
+        return text("{} is on or off; \"{}\" is neither", setting.key, word);
+    std::string names;
+    for (const auto choice : setting.choices)
+        names.append(names.empty() ? "" : ", ").append(choice);
+    return text("{} is one of {}; \"{}\" is none of them", setting.key, names, word);
 }
 
 // Why the key may not be changed here; none when it may.
@@ -84,11 +112,11 @@ int refuse(const std::string& why, Output& output) {
 int setSetting(const Arguments& arguments, Output& output) {
     const auto& key = arguments.operands[0];
     const auto& word = arguments.operands[1];
-    const auto value = switchOf(word);
-    if (findSetting(key) && !value)
-        return refuse(text("{} is on or off; \"{}\" is neither", key, word), output);
+    const auto* setting = findSetting(key);
+    const auto value = setting ? valueFor(*setting, word) : std::nullopt;
+    if (setting && !value) return refuse(notAValue(*setting, word), output);
     if (const auto why = refusalOf(key)) return refuse(*why, output);
-    return change(arguments, PropertyList(*value), output);
+    return change(arguments, value, output);
 }
 
 int unsetSetting(const Arguments& arguments, Output& output) {

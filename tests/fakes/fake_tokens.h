@@ -36,12 +36,16 @@ public:
 
     // Lets the cards answer everything that was asked of them, also in the course of it.
     void settle() {
-        while (!_due.empty()) {
-            const auto next = std::move(_due.front());
-            _due.pop_front();
-            next();
-        }
+        while (!_due.empty()) answerOne();
     }
+    void answerOne() {
+        const auto next = std::move(_due.front());
+        _due.pop_front();
+        next();
+    }
+
+    // What a wrap key makes of what it is to open; none when it fails.
+    std::function<std::optional<service::Secret>(const service::OpenRequest&)> open;
 
     // What happened.
     int listings = 0;
@@ -82,7 +86,16 @@ private:
         if (proof.outcome != Outcome::Signed) return proof;
         proof.signature = signature(request.publicKeyHash, request.challenge);
         if (_signsWrongly) proof.signature[0] ^= 1U;
+        if (request.open) letOpen(*request.open, proof);
         return proof;
+    }
+
+    void letOpen(const service::OpenRequest& request, service::Proof& proof) {
+        auto opened = open ? open(request) : std::nullopt;
+        if (opened)
+            proof.opened = std::make_shared<const service::Secret>(std::move(*opened));
+        else
+            proof.whyNotOpened = "the wrap key is gone";
     }
 
     service::Proof::Outcome judge(const service::ProofRequest& request) {

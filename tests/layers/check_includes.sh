@@ -79,7 +79,8 @@ while IFS= read -r file; do
             # The administrator's tool is a client that stands on the floors, not below them.
             services/vlmctl/*)
                 check_lower "$file" "$include" platform hints settings bind services ;;
-            services/*) check_lower "$file" "$include" platform services ;;
+            # Who lets people in goes by the settings.
+            services/*) check_lower "$file" "$include" platform settings services ;;
             *) check_upper "$file" "$(floor_number "${file%%/*}")" "$include" ;;
         esac
     done < <(sed -nE 's/^[[:space:]]*#[[:space:]]*include[[:space:]]*([<"][^>"]+[>"]).*/\1/p' "$file")

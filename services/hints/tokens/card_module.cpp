@@ -95,25 +95,35 @@ const TokenObjects* CardModule::objectsOf(const SlotToken& token, KnownTokens& p
     auto session = _module->openSession(token.slot);
     auto objects = session ? readObjects(*session) : std::nullopt;
     if (!objects) return nullptr;
+    objects->wrapMechanisms = wrapMechanismsIn(*_module, token.slot);
     KnownToken fresh{token, std::move(session), std::move(*objects)};
     return &present.emplace(token.fields, std::move(fresh)).first->second.objects;
 }
 
-Proof CardModule::prove(ProofRequest request) {
+std::optional<Opening> CardModule::prove(ProofRequest request,
+                                         const std::function<void(const Proof&)>& tell) {
     const auto slotTokens = _module->tokens();
     for (const SlotToken& slotToken : slotTokens.value_or(std::vector<SlotToken>{})) {
         if (slotToken.result != CKR_OK ||
             tokenIdentifier(slotToken.fields) != request.tokenIdentifier)
             continue;
         const TokenObjects* objects = objectsOf(slotToken, _known);
-        Proof proof;
-        if (objects == nullptr)
+        if (objects == nullptr) {
+            Proof proof;
             proof.reason = "the card \"" + describeToken(slotToken).name + "\" cannot be read";
-        else
-            proof = TokenProver(*_module, slotToken, *objects).prove(request);
-        return proof;
+            tell(proof);
+            return {};
+        }
+        std::optional<TokenProver> prover(std::in_place, *_module, slotToken, *objects);
+        const Proof proof = prover->prove(request);
+        const bool opens = request.open && proof.outcome == Proof::Outcome::Signed;
+        // The card is logged out before anybody hears that it has done all that was asked of it.
+        if (!opens) prover.reset();
+        tell(proof);
+        return opens ? std::optional(prover->open(request)) : std::nullopt;
     }
-    return {Proof::Outcome::NoSuchToken, {}, PinState::Ready, "the card is not inserted"};
+    tell({Proof::Outcome::NoSuchToken, {}, PinState::Ready, "the card is not inserted"});
+    return {};
 }
 
 }  // namespace vlm::service

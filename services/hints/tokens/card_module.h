@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <memory>
 #include <optional>
@@ -13,6 +14,7 @@
 
 #include "services/hints/tokens.h"
 #include "services/hints/tokens/identities.h"
+#include "services/hints/tokens/key_opener.h"
 #include "services/hints/tokens/pkcs11_module.h"
 
 namespace vlm::service {
@@ -31,7 +33,11 @@ public:
     Listing list(std::int64_t now);
     // Whether a token can come without a word. A module without any slot waits for a reader.
     bool announcesNothing() const { return _module->hasSlots() && _module->isSoftware(); }
-    Proof prove(ProofRequest request);
+
+    // Tells the proof to `tell`, once; then answers what the request wants opened, or none when it
+    // wants nothing, or nothing was signed.
+    std::optional<Opening> prove(ProofRequest request,
+                                 const std::function<void(const Proof&)>& tell);
 
 private:
     struct KnownToken {

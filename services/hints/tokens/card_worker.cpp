@@ -112,25 +112,55 @@ bool CardWorker::ensureProcess() {
     _process = startWorker(_command);
     if (!_process) return false;
     _incoming = {};
+    _secret.reset();
     _hasListed = false;
     _readable = callWhenReadable(_event, _process->socket.get(), [this] { receive(); });
     return _readable != nullptr;
 }
 
+// None when there is nothing to read, or the worker was ended.
+std::optional<std::size_t> CardWorker::receiveInto(std::span<std::uint8_t> room) {
+    const ssize_t size = recv(_process->socket.get(), room.data(), room.size(), MSG_DONTWAIT);
+    if (size > 0) return static_cast<std::size_t>(size);
+    if (size == 0 || (errno != EAGAIN && errno != EINTR)) fail(kEnded);
+    return {};
+}
+
 void CardWorker::receive() {
+    if (_secret) return receiveSecret();
     std::array<std::uint8_t, 64UL * 1024> piece;
-    const ssize_t size = recv(_process->socket.get(), piece.data(), piece.size(), MSG_DONTWAIT);
-    if (size < 0 && (errno == EAGAIN || errno == EINTR)) return;
-    if (size <= 0) return fail(kEnded);
+    const auto room = std::span(piece).first(std::min(piece.size(), _incoming.missing()));
+    const auto size = receiveInto(room);
+    if (!size) return;
     if (!_current) return fail("spoke without being asked");
-    switch (_incoming.add(std::span(piece).first(static_cast<std::size_t>(size)))) {
-        case FrameAssembler::State::Incomplete:
+    switch (_incoming.add(room.first(*size))) {
+        case FrameState::Incomplete:
             return;
-        case FrameAssembler::State::TooLong:
+        case FrameState::TooLong:
             return fail("gave an answer that is too long");
-        case FrameAssembler::State::Complete:
+        case FrameState::Complete:
             return receiveAnswer(_incoming.take());
     }
+}
+
+void CardWorker::receiveSecret() {
+    const auto size = receiveInto(_secret->room());
+    if (!size) return;
+    switch (_secret->filled(*size)) {
+        case FrameState::Incomplete:
+            return;
+        case FrameState::TooLong:
+            return fail("gave an answer that is too long");
+        case FrameState::Complete:
+            break;
+    }
+    Secret opened = _secret->take();
+    _secret.reset();
+    if (opened.empty() == _current->signedProof->whyNotOpened.empty())
+        return fail("gave an answer that makes no sense");
+    Proof proof = std::move(*_current->signedProof);
+    if (!opened.empty()) proof.opened = std::make_shared<const Secret>(std::move(opened));
+    finishProof(std::move(proof));
 }
 
 void CardWorker::receiveAnswer(const Bytes& message) {
@@ -138,13 +168,26 @@ void CardWorker::receiveAnswer(const Bytes& message) {
     if (!answer) return fail("gave an answer that makes no sense");
     if (const auto* failed = std::get_if<FailedAnswer>(&*answer))
         return fail("is of no use: " + failed->reason);
-    auto* listed = std::get_if<ListAnswer>(&*answer);
-    if ((listed != nullptr) == _current->proof.has_value())
-        return fail("gave an answer to another question");
-    if (listed != nullptr)
-        finishList(std::move(*listed));
-    else
-        finishProof(std::move(std::get<Proof>(*answer)));
+    if (auto* listed = std::get_if<ListAnswer>(&*answer); listed != nullptr && !_current->proof)
+        return finishList(std::move(*listed));
+    if (auto* proof = std::get_if<Proof>(&*answer);
+        proof != nullptr && _current->proof && !_current->signedProof)
+        return takeProof(std::move(*proof));
+    if (auto* opening = std::get_if<OpeningAnswer>(&*answer);
+        opening != nullptr && _current->signedProof)
+        return takeOpening(std::move(*opening));
+    fail("gave an answer to another question");
+}
+
+void CardWorker::takeProof(Proof proof) {
+    if (proof.outcome != Proof::Outcome::Signed || !_current->proof->open)
+        return finishProof(std::move(proof));
+    _current->signedProof = std::move(proof);
+}
+
+void CardWorker::takeOpening(OpeningAnswer answer) {
+    _current->signedProof->whyNotOpened = std::move(answer.whyNot);
+    _secret.emplace(kMostOpenedBytes);
 }
 
 void CardWorker::finishList(ListAnswer answer) {
@@ -205,17 +248,19 @@ void CardWorker::fail(const std::string& why) {
     _isBehind = false;
     report("the card module " + _name + " " + why);
     if (!_current) return;
-    const Job job = std::move(*_current);
+    Job job = std::move(*_current);
     _current.reset();
     scheduleStart();
     if (!job.proof) {
         if (job.listed) job.listed({});
         return;
     }
-    job.proved({Proof::Outcome::CardFailed,
-                {},
-                PinState::Ready,
-                "the module of the card (" + _name + ") " + why});
+    const std::string reason = "the module of the card (" + _name + ") " + why;
+    if (!job.signedProof)
+        return job.proved({Proof::Outcome::CardFailed, {}, PinState::Ready, reason});
+    Proof proof = std::move(*job.signedProof);
+    proof.whyNotOpened = reason;
+    job.proved(std::move(proof));
 }
 
 LookAgain CardWorker::lookAgain() const {

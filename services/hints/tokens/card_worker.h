@@ -2,8 +2,9 @@
 //
 // The worker serves one request at a time; others wait. A worker that ends, breaks its word or
 // takes longer than the limit of a reading or a proof is ended, fails what it was asked for, and is
-// started anew for the next request. Without a request for a while it is ended as well, so that its
-// memory comes back.
+// started anew for the next request. A proof that the card has signed already stays one, when the
+// worker fails in opening what was to be opened with it. Without a request for a while it is ended
+// as well, so that its memory comes back.
 //
 // A listing that takes longer than its askers wait, because a card is slow to read or because a
 // proof (which may wait for a person at a PIN pad) is before it, is answered with the tokens that
@@ -19,6 +20,7 @@
 #include <list>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -61,6 +63,7 @@ private:
         std::optional<ProofRequest> proof;          // none: a listing
         std::function<void(const Tokens&)> listed;  // empty once the asker waits no longer
         std::function<void(Proof)> proved;
+        std::optional<Proof> signedProof;  // there already, while what is to be opened is not
         EventSource limit;
     };
 
@@ -70,7 +73,11 @@ private:
     bool send(Job& job);
     bool ensureProcess();
     void receive();
+    void receiveSecret();
+    std::optional<std::size_t> receiveInto(std::span<std::uint8_t> room);
     void receiveAnswer(const Bytes& message);
+    void takeProof(Proof proof);
+    void takeOpening(OpeningAnswer answer);
     void finishList(ListAnswer answer);
     void finishProof(Proof proof);
     void limitCurrent();
@@ -94,8 +101,9 @@ private:
     std::optional<WorkerProcess> _process;
     EventSource _readable;
     FrameAssembler _incoming;
-    bool _hasListed = false;  // this process has told its tokens
-    bool _isBehind = false;   // an asker did not wait for the end of a listing
+    std::optional<SecretAssembler> _secret;  // while the next frame holds one
+    bool _hasListed = false;                 // this process has told its tokens
+    bool _isBehind = false;                  // an asker did not wait for the end of a listing
     bool _announcesNothing = false;
 
     Tokens _tokens;

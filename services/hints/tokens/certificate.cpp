@@ -2,10 +2,10 @@
 
 #include <openssl/core_names.h>
 
-#include <ctime>
-
 #include "services/hints/tokens/card_text.h"
+#include "services/hints/tokens/key_strength.h"
 #include "services/hints/tokens/openssl_handles.h"
+#include "services/hints/tokens/openssl_time.h"
 #include "services/hints/tokens/signature.h"
 
 namespace vlm::service {
@@ -60,12 +60,6 @@ std::string nameOf(const X509* certificate) {
     return alternateName(names.get(), principalOf);
 }
 
-std::optional<std::int64_t> secondsOf(const ASN1_TIME* time) {
-    std::tm parts = {};
-    if (ASN1_TIME_to_tm(time, &parts) != 1) return {};
-    return timegm(&parts);
-}
-
 Bytes number(const EVP_PKEY* key, const char* name, std::size_t size) {
     BIGNUM* raw = nullptr;
     if (EVP_PKEY_get_bn_param(key, name, &raw) != 1) return {};
@@ -104,9 +98,12 @@ bool readKey(EVP_PKEY* key, CertificateFacts& facts) {
 void readKeyUsage(X509* certificate, CertificateFacts& facts) {
     const std::uint32_t usage = X509_get_key_usage(certificate);  // all bits when it is absent
     const bool rsa = facts.keyKind == KeyKind::Rsa;
+    const bool strong = EVP_PKEY_get_bits(X509_get0_pubkey(certificate)) >=
+                        (rsa ? kSmallestRsaKey : kSmallestCurve);
+    const std::uint32_t wrapping =
+        rsa ? KU_KEY_ENCIPHERMENT | KU_DATA_ENCIPHERMENT : KU_KEY_AGREEMENT;
     facts.maySign = (usage & (KU_DIGITAL_SIGNATURE | KU_NON_REPUDIATION)) != 0;
-    facts.mayWrap =
-        (usage & (rsa ? KU_KEY_ENCIPHERMENT | KU_DATA_ENCIPHERMENT : KU_KEY_AGREEMENT)) != 0;
+    facts.mayWrap = strong && (usage & wrapping) != 0;
 }
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include <sys/uio.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 
@@ -103,26 +104,45 @@ bool sendFrames(int socket, std::span<const std::uint8_t> content, const Secret*
     return sent >= 0 && static_cast<std::size_t>(sent) == size;
 }
 
-FrameAssembler::State FrameAssembler::add(std::span<const std::uint8_t> piece) {
+FrameState FrameAssembler::add(std::span<const std::uint8_t> piece) {
     _received.insert(_received.end(), piece.begin(), piece.end());
     return state();
 }
 
-FrameAssembler::State FrameAssembler::state() const {
-    if (_received.size() < kHeader) return State::Incomplete;
-    if (announced() > kMostFrameBytes) return State::TooLong;
-    return _received.size() >= kHeader + announced() ? State::Complete : State::Incomplete;
+FrameState FrameAssembler::state() const {
+    if (_received.size() < kHeader) return FrameState::Incomplete;
+    if (announced() > kMostFrameBytes) return FrameState::TooLong;
+    return missing() == 0 ? FrameState::Complete : FrameState::Incomplete;
+}
+
+std::size_t FrameAssembler::missing() const {
+    const std::size_t whole = _received.size() < kHeader ? kHeader : kHeader + announced();
+    return whole - std::min(whole, _received.size());
 }
 
 std::size_t FrameAssembler::announced() const { return sizeIn(_received); }
 
 Bytes FrameAssembler::take() {
-    if (state() != State::Complete) return {};
+    if (state() != FrameState::Complete) return {};
     const auto begin = _received.begin() + kHeader;
     const auto end = begin + static_cast<std::ptrdiff_t>(announced());
     Bytes content(begin, end);
     _received.erase(_received.begin(), end);
     return content;
+}
+
+std::span<std::uint8_t> SecretAssembler::room() {
+    if (_received < kHeader) return std::span(_header).subspan(_received);
+    return _secret.octets().subspan(_received - kHeader);
+}
+
+FrameState SecretAssembler::filled(std::size_t size) {
+    const bool hadHeader = _received >= kHeader;
+    _received += size;
+    if (_received < kHeader) return FrameState::Incomplete;
+    if (sizeIn(_header) > _most) return FrameState::TooLong;
+    if (!hadHeader) _secret = Secret::ofSize(sizeIn(_header));
+    return room().empty() ? FrameState::Complete : FrameState::Incomplete;
 }
 
 }  // namespace vlm::service

@@ -3,9 +3,11 @@
 
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <optional>
 #include <span>
+#include <utility>
 
 #include "platform/types.h"
 #include "services/hints/secret.h"
@@ -27,21 +29,47 @@ bool writeFrame(int socket, std::span<const std::uint8_t> content);
 // the secret; false when it does not go out whole.
 bool sendFrames(int socket, std::span<const std::uint8_t> content, const Secret* secret);
 
+enum class FrameState { Incomplete, Complete, TooLong };
+
 // Puts frames together out of what comes in piece by piece.
 class FrameAssembler {
 public:
-    enum class State { Incomplete, Complete, TooLong };
+    FrameState add(std::span<const std::uint8_t> piece);
 
-    State add(std::span<const std::uint8_t> piece);
+    // How many bytes are known to be missing. Who reads no more than these leaves the next frame,
+    // which may hold a secret, untouched.
+    std::size_t missing() const;
 
     // The first complete frame; what follows it stays.
     Bytes take();
 
 private:
-    State state() const;
+    FrameState state() const;
     std::size_t announced() const;
 
     Bytes _received;
+};
+
+// Puts one frame together in the memory of a secret.
+class SecretAssembler {
+public:
+    explicit SecretAssembler(std::size_t most) : _most(most) {}
+
+    // Where the next bytes of the frame belong; not empty while it is incomplete.
+    std::span<std::uint8_t> room();
+    // That many bytes were put there.
+    FrameState filled(std::size_t size);
+
+    // The complete frame.
+    Secret take() { return std::move(_secret); }
+
+private:
+    static constexpr std::size_t kHeader = 4;
+
+    std::size_t _most;
+    std::array<std::uint8_t, kHeader> _header{};
+    Secret _secret;
+    std::size_t _received = 0;  // with the header
 };
 
 }  // namespace vlm::service

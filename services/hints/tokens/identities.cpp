@@ -71,6 +71,36 @@ struct Candidate {
     KeyAbilities key;
 };
 
+std::optional<WrapScheme> schemeFor(KeyKind kind, const WrapMechanisms& mechanisms) {
+    if (kind == KeyKind::Ec)
+        return mechanisms.ecdh ? std::optional(WrapScheme::Ecdh) : std::nullopt;
+    if (mechanisms.oaep) return WrapScheme::RsaOaepSha256;
+    return mechanisms.pkcs1 ? std::optional(WrapScheme::RsaPkcs1) : std::nullopt;
+}
+
+// RSA goes before EC, but its old padding only where a card can do no other.
+int rankOf(WrapScheme scheme) {
+    switch (scheme) {
+        case WrapScheme::RsaOaepSha256:
+            return 0;
+        case WrapScheme::Ecdh:
+            return 1;
+        case WrapScheme::RsaPkcs1:
+            return 2;
+    }
+    return 3;
+}
+
+// Called with the smallest hash first, which stays the choice among keys of one rank.
+void offerWrapKey(const Candidate& candidate, const WrapMechanisms& mechanisms, Token& token) {
+    const CertificateFacts& facts = candidate.certificate->facts;
+    const auto scheme = schemeFor(facts.keyKind, mechanisms);
+    if (!scheme || !facts.mayWrap || !candidate.key.wraps) return;
+    if (token.wrapKeyHash && rankOf(token.wrapScheme) <= rankOf(*scheme)) return;
+    token.wrapKeyHash = facts.publicKeyHash;
+    token.wrapScheme = *scheme;
+}
+
 }  // namespace
 
 SameKey sameKey(const KeyObject& key, const CertificateFacts& certificate) {
@@ -93,7 +123,6 @@ void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token) 
             place->second = {&certificate, *key};
     }
 
-    std::optional<KeyKind> wrapKind;
     for (const auto& [hash, candidate] : byHash) {
         const CertificateFacts& facts = candidate.certificate->facts;
         Identity identity;
@@ -103,16 +132,14 @@ void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token) 
         identity.notBefore = facts.notBefore;
         identity.notAfter = facts.notAfter;
         identity.canSign = facts.maySign && candidate.key.signs;
+        identity.certificate = candidate.certificate->der;
         token.identities.push_back(std::move(identity));
-
-        // RSA goes before EC, and among keys of a kind the smallest hash, which comes first here.
-        const bool better =
-            !wrapKind || (*wrapKind == KeyKind::Ec && facts.keyKind == KeyKind::Rsa);
-        if (facts.mayWrap && candidate.key.wraps && better) {
-            wrapKind = facts.keyKind;
-            token.wrapKeyHash = hash;
-        }
+        offerWrapKey(candidate, objects.wrapMechanisms, token);
     }
+
+    for (const CertificateObject& certificate : objects.certificates)
+        if (!byHash.contains(certificate.facts.publicKeyHash))
+            token.otherCertificates.push_back(certificate.der);
 }
 
 }  // namespace vlm::service

@@ -20,6 +20,7 @@ struct CertificateObject {
     Bytes id;
     std::string label;  // harmless already
     CertificateFacts facts;
+    Bytes der;
 };
 
 struct KeyObject {
@@ -28,20 +29,29 @@ struct KeyObject {
     Bytes id;
     Bytes publicPart;  // RSA: modulus; EC: point; as the module gives it, empty when it tells none
     bool signs = false;  // private: may sign; public: may verify
-    bool wraps = false;  // may decrypt or unwrap, encrypt or wrap; EC: may derive
+    bool wraps = false;  // private: may decrypt; public: may encrypt; EC: may derive
+};
+
+// What the token's wrap keys could be asked to do.
+struct WrapMechanisms {
+    bool oaep = false;  // or the bare operation, whose padding can be taken off here
+    bool pkcs1 = false;
+    bool ecdh = false;
 };
 
 struct TokenObjects {
     std::vector<CertificateObject> certificates;
     std::vector<KeyObject> keys;
     bool showsKeys = false;  // key objects of any kind, also of kinds that are not in `keys`
+    WrapMechanisms wrapMechanisms;
 };
 
 // Whether the object holds the certificate's key.
 enum class SameKey { Yes, No, Untold };
 SameKey sameKey(const KeyObject& key, const CertificateFacts& certificate);
 
-// Fills in the token's identities and its wrap key, as they are at the given time.
+// Fills in the token's identities, its wrap key and its other certificates, as they are at the
+// given time.
 void addIdentities(const TokenObjects& objects, std::int64_t now, Token& token);
 
 }  // namespace vlm::service

@@ -74,10 +74,11 @@ bool namesThisProgram(std::string_view list) {
     return false;
 }
 
-bool isForCards(const Settings& settings) {
+bool isWanted(const Settings& settings, ModuleKind kind) {
     if (settingOf(settings, "module").empty() || !settingOf(settings, "remote").empty())
         return false;
-    if (settingOf(settings, "trust-policy") == "yes") return false;
+    const bool isTrust = settingOf(settings, "trust-policy") == "yes";
+    if (isTrust != (kind == ModuleKind::Trust)) return false;
     if (const auto only = settingOf(settings, "enable-in"); !only.empty())
         return namesThisProgram(only);
     return !namesThisProgram(settingOf(settings, "disable-in"));
@@ -115,14 +116,14 @@ ModuleFolders ModuleFolders::ofThisMachine() {
     return {VLM_P11_PACKAGE_FILES, VLM_P11_ADMIN_FILES, VLM_P11_MODULES};
 }
 
-std::vector<ConfiguredModule> configuredModules(const ModuleFolders& folders) {
+std::vector<ConfiguredModule> configuredModules(const ModuleFolders& folders, ModuleKind kind) {
     std::map<std::string, Settings> byName;
     addFolder(folders.adminFiles, byName);
     addFolder(folders.packageFiles, byName);
 
     std::vector<std::pair<int, ConfiguredModule>> modules;
     for (const auto& [name, settings] : byName) {
-        if (!isForCards(settings)) continue;
+        if (!isWanted(settings, kind)) continue;
         std::error_code error;
         const fs::path path =
             fs::canonical(fs::path(folders.modules) / settingOf(settings, "module"), error);

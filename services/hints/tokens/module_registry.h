@@ -24,9 +24,13 @@ struct ConfiguredModule {
     bool operator==(const ConfiguredModule&) const = default;
 };
 
-// The modules to load, most important first, each once. Modules that run elsewhere, that only hold
-// trust anchors or that are not meant for this program are left out. A file that is not well
-// formed, or whose module is not there, is one line in the log; the others count all the same.
-std::vector<ConfiguredModule> configuredModules(const ModuleFolders& folders);
+// What a module is for: one that holds trust anchors is no card's.
+enum class ModuleKind { Card, Trust };
+
+// The modules to load, most important first, each once. Modules that run elsewhere, that are of
+// another kind or that are not meant for this program are left out. A file that is not well formed,
+// or whose module is not there, is one line in the log; the others count all the same.
+std::vector<ConfiguredModule> configuredModules(const ModuleFolders& folders,
+                                                ModuleKind kind = ModuleKind::Card);
 
 }  // namespace vlm::service

@@ -108,10 +108,10 @@ std::optional<Pkcs11Session> Pkcs11Module::openSession(CK_SLOT_ID slot) const {
     return Pkcs11Session(_module, session);
 }
 
-bool Pkcs11Module::offers(CK_SLOT_ID slot, CK_MECHANISM_TYPE mechanism) const {
+bool Pkcs11Module::offers(CK_SLOT_ID slot, CK_MECHANISM_TYPE mechanism, CK_FLAGS what) const {
     CK_MECHANISM_INFO info = {};
     return _module->C_GetMechanismInfo(slot, mechanism, &info) == CKR_OK &&
-           (info.flags & CKF_SIGN) != 0;
+           (info.flags & what) != 0;
 }
 
 }  // namespace vlm::service

@@ -91,7 +91,8 @@ public:
     bool hasSlots() const;
 
     std::optional<Pkcs11Session> openSession(CK_SLOT_ID slot) const;
-    bool offers(CK_SLOT_ID slot, CK_MECHANISM_TYPE mechanism) const;
+    // Whether the slot's token does it; what for is a flag like CKF_SIGN.
+    bool offers(CK_SLOT_ID slot, CK_MECHANISM_TYPE mechanism, CK_FLAGS what) const;
 
 private:
     explicit Pkcs11Module(CK_FUNCTION_LIST* module) : _module(module) {}

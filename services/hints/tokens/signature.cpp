@@ -5,17 +5,16 @@
 
 #include <algorithm>
 
+#include "services/hints/tokens/key_strength.h"
 #include "services/hints/tokens/openssl_handles.h"
 
 namespace vlm::service {
 namespace {
 
-constexpr int kSmallestRsaKey = 2048;
-
 // The key, when it is of a kind that signs here and the DER holds nothing else.
-PublicKeyHandle readKey(std::span<const std::uint8_t> der) {
+KeyHandle readKey(std::span<const std::uint8_t> der) {
     const unsigned char* end = der.data();
-    PublicKeyHandle key(d2i_PUBKEY(nullptr, &end, static_cast<long>(der.size())));
+    KeyHandle key(d2i_PUBKEY(nullptr, &end, static_cast<long>(der.size())));
     if (!key || end != der.data() + der.size()) return nullptr;
     const int kind = EVP_PKEY_get_base_id(key.get());
     const bool usable = kind == EVP_PKEY_EC ||
@@ -37,7 +36,7 @@ bool verifySignature(std::span<const std::uint8_t> publicKeyInfo,
                      std::span<const std::uint8_t> signature) {
     if (!std::ranges::equal(sha256(publicKeyInfo), publicKeyHash)) return false;
     const QuietErrors quiet;
-    const PublicKeyHandle key = readKey(publicKeyInfo);
+    const KeyHandle key = readKey(publicKeyInfo);
     const DigestContext context(EVP_MD_CTX_new());
     return key && context &&
            EVP_DigestVerifyInit(context.get(), nullptr, EVP_sha256(), nullptr, key.get()) == 1 &&

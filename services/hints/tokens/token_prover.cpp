@@ -1,7 +1,6 @@
 #include "services/hints/tokens/token_prover.h"
 
-#include <algorithm>
-#include <set>
+#include <utility>
 
 #include "platform/text.h"
 #include "services/hints/tokens/raw_signature.h"
@@ -14,11 +13,6 @@ namespace {
 using Outcome = Proof::Outcome;
 
 constexpr std::size_t kMostSignatureBytes = 4096;  // an RSA key of 32768 bits
-
-struct Logout {
-    const Pkcs11Session& session;
-    ~Logout() { session.module()->C_Logout(session.handle()); }
-};
 
 Outcome outcomeOf(CK_RV result) {
     switch (result) {
@@ -56,13 +50,6 @@ std::string pinSentence(PinState state) {
     return "";
 }
 
-// The PIN is handed over as it is, or not at all where the reader asks for it.
-CK_RV login(const Pkcs11Session& session, CK_USER_TYPE user, Secret& pin, bool hasPinPad) {
-    auto* text = reinterpret_cast<CK_UTF8CHAR*>(pin.memory().data());
-    return hasPinPad ? session.module()->C_Login(session.handle(), user, nullptr, 0)
-                     : session.module()->C_Login(session.handle(), user, text, pin.text().size());
-}
-
 }  // namespace
 
 TokenProver::TokenProver(const Pkcs11Module& module, const SlotToken& slotToken,
@@ -70,7 +57,7 @@ TokenProver::TokenProver(const Pkcs11Module& module, const SlotToken& slotToken,
     : _module(module), _slotToken(slotToken), _objects(objects), _token(describeToken(slotToken)) {}
 
 Proof TokenProver::prove(ProofRequest& request) {
-    const CertificateFacts* facts = factsOf(request.publicKeyHash);
+    const CertificateFacts* facts = factsOf(_objects, request.publicKeyHash);
     if (facts == nullptr)
         return {Outcome::NoSuchKey,
                 {},
@@ -82,29 +69,30 @@ Proof TokenProver::prove(ProofRequest& request) {
                 PinState::Locked,
                 "the PIN of the card \"" + _token.name + "\" is locked"};
 
-    const auto session = _module.openSession(_slotToken.slot);
-    if (!session) return failed(CKR_GENERAL_ERROR, "opened no session");
-    if (auto refused = login(*session, request.pin)) return std::move(*refused);
-    const Logout logout{*session};
-    const auto keys = keysOf(*session, request.publicKeyHash);
+    _session = _module.openSession(_slotToken.slot);
+    if (!_session) return failed(CKR_GENERAL_ERROR, "opened no session");
+    if (auto refused = login(request.pin)) return std::move(*refused);
+    _isLoggedIn = true;
+    const auto keys = privateKeysOf(*_session, _objects, request.publicKeyHash);
     if (keys.empty())
         return {Outcome::NoSuchKey,
                 {},
                 pinState(),
                 "the card \"" + _token.name + "\" has the certificate but not its key"};
-    return signWithOneOf(*session, keys, *facts, request);
+    return signWithOneOf(keys, *facts, request);
 }
 
-const CertificateFacts* TokenProver::factsOf(const Bytes& hash) const {
-    const auto found = std::ranges::find_if(_objects.certificates, [&hash](const auto& each) {
-        return each.facts.publicKeyHash == hash;
-    });
-    return found == _objects.certificates.end() ? nullptr : &found->facts;
+TokenProver::~TokenProver() {
+    if (_isLoggedIn) _session->module()->C_Logout(_session->handle());
+}
+
+Opening TokenProver::open(ProofRequest& request) {
+    return KeyOpener(_module, _slotToken, _objects, *_session).open(*request.open, request.pin);
 }
 
 // Why the token did not let anybody in; none when it did, or when it needs no login and no PIN
 // was given.
-std::optional<Proof> TokenProver::login(const Pkcs11Session& session, Secret& pin) {
+std::optional<Proof> TokenProver::login(Secret& pin) {
     if (!_token.needsLogin && pin.empty()) return {};
     if (!_token.hasPinPad && pin.empty())
         return Proof{Outcome::CardFailed,
@@ -112,11 +100,11 @@ std::optional<Proof> TokenProver::login(const Pkcs11Session& session, Secret& pi
                      _token.pinState,
                      "the card \"" + _token.name + "\" needs a PIN and none was given"};
 
-    CK_RV result = service::login(session, CKU_USER, pin, _token.hasPinPad);
+    CK_RV result = service::login(*_session, CKU_USER, pin, _token.hasPinPad);
     if (result == CKR_USER_ALREADY_LOGGED_IN) {
         // Somebody's login is no answer: this PIN has not been looked at yet.
-        session.module()->C_Logout(session.handle());
-        result = service::login(session, CKU_USER, pin, _token.hasPinPad);
+        _session->module()->C_Logout(_session->handle());
+        result = service::login(*_session, CKU_USER, pin, _token.hasPinPad);
     }
     if (result == CKR_OK) return {};
     Proof proof = failed(result, "let nobody in");
@@ -126,38 +114,13 @@ std::optional<Proof> TokenProver::login(const Pkcs11Session& session, Secret& pi
     return proof;
 }
 
-// The private keys that can be the one behind the hash, the surest first.
-std::vector<TokenProver::PrivateKey> TokenProver::keysOf(const Pkcs11Session& session,
-                                                         const Bytes& hash) const {
-    std::vector<PrivateKey> keys;
-    std::set<Bytes> ids;
-    for (const CertificateObject& certificate : _objects.certificates) {
-        const CertificateFacts& facts = certificate.facts;
-        if (facts.publicKeyHash != hash || !ids.insert(certificate.id).second) continue;
-        const auto handles = findPrivateKeys(session, facts.keyKind, certificate.id);
-        if (!handles) continue;
-        for (const CK_OBJECT_HANDLE handle : *handles) {
-            const auto key = readKey(session, handle, /*isPrivate=*/true);
-            const SameKey same = key ? sameKey(*key, facts) : SameKey::No;
-            if (same == SameKey::No) continue;
-            const bool always =
-                session.read(handle, {CKA_ALWAYS_AUTHENTICATE}).flag(CKA_ALWAYS_AUTHENTICATE);
-            keys.push_back({handle, always, same});
-        }
-    }
-    std::stable_partition(keys.begin(), keys.end(),
-                          [](const PrivateKey& key) { return key.sameKey == SameKey::Yes; });
-    return keys;
-}
-
 // Several keys may bear one id, and some do not tell which they are: the signature does.
-Proof TokenProver::signWithOneOf(const Pkcs11Session& session, const std::vector<PrivateKey>& keys,
-                                 const CertificateFacts& facts, ProofRequest& request) {
-    constexpr std::size_t kMostKeysTried = 4;
+Proof TokenProver::signWithOneOf(const std::vector<PrivateKey>& keys, const CertificateFacts& facts,
+                                 ProofRequest& request) {
     Proof proof;
-    for (const PrivateKey& key : std::span(keys).first(std::min(keys.size(), kMostKeysTried))) {
+    for (const PrivateKey& key : keys) {
         Bytes signature;
-        const CK_RV result = sign(session, key, facts, request, signature);
+        const CK_RV result = sign(key, facts, request, signature);
         if (result != CKR_OK) {
             proof = failed(result, "did not sign");
             if (proof.outcome != Outcome::CardFailed) return proof;
@@ -173,11 +136,11 @@ Proof TokenProver::signWithOneOf(const Pkcs11Session& session, const std::vector
     return proof;
 }
 
-CK_RV TokenProver::sign(const Pkcs11Session& session, const PrivateKey& key,
-                        const CertificateFacts& facts, ProofRequest& request,
+CK_RV TokenProver::sign(const PrivateKey& key, const CertificateFacts& facts, ProofRequest& request,
                         Bytes& signature) const {
-    const bool hashes =
-        facts.keyKind == KeyKind::Rsa && _module.offers(_slotToken.slot, CKM_SHA256_RSA_PKCS);
+    const Pkcs11Session& session = *_session;
+    const bool hashes = facts.keyKind == KeyKind::Rsa &&
+                        _module.offers(_slotToken.slot, CKM_SHA256_RSA_PKCS, CKF_SIGN);
     Bytes input = hashes ? request.challenge : signatureInput(facts, request.challenge);
     CK_MECHANISM mechanism = {};
     mechanism.mechanism = facts.keyKind == KeyKind::Ec ? CKM_ECDSA

@@ -1,5 +1,6 @@
-// One proof: log in to a token with a PIN, once, and let one of its keys sign a challenge. Whatever
-// happens, the token is logged out and the session closed at the end.
+// One proof: log in to a token with a PIN, once, and let one of its keys sign a challenge, and
+// another one open something. Whatever happens, the token is logged out and the session closed at
+// the end of the prover's life.
 
 #pragma once
 
@@ -9,7 +10,9 @@
 
 #include "services/hints/tokens.h"
 #include "services/hints/tokens/identities.h"
+#include "services/hints/tokens/key_opener.h"
 #include "services/hints/tokens/pkcs11_module.h"
+#include "services/hints/tokens/private_keys.h"
 
 namespace vlm::service {
 
@@ -18,23 +21,22 @@ public:
     // What is given must outlive the prover.
     TokenProver(const Pkcs11Module& module, const SlotToken& slotToken,
                 const TokenObjects& objects);
+    ~TokenProver();
+    TokenProver(const TokenProver&) = delete;
+    TokenProver& operator=(const TokenProver&) = delete;
 
+    // Called once.
     Proof prove(ProofRequest& request);
 
-private:
-    struct PrivateKey {
-        CK_OBJECT_HANDLE handle;
-        bool alwaysAuthenticate;
-        SameKey sameKey;
-    };
+    // What the request wants opened; after a proof that was signed.
+    Opening open(ProofRequest& request);
 
-    std::optional<Proof> login(const Pkcs11Session& session, Secret& pin);
-    std::vector<PrivateKey> keysOf(const Pkcs11Session& session, const Bytes& hash) const;
-    Proof signWithOneOf(const Pkcs11Session& session, const std::vector<PrivateKey>& keys,
-                        const CertificateFacts& facts, ProofRequest& request);
-    CK_RV sign(const Pkcs11Session& session, const PrivateKey& key, const CertificateFacts& facts,
-               ProofRequest& request, Bytes& signature) const;
-    const CertificateFacts* factsOf(const Bytes& hash) const;
+private:
+    std::optional<Proof> login(Secret& pin);
+    Proof signWithOneOf(const std::vector<PrivateKey>& keys, const CertificateFacts& facts,
+                        ProofRequest& request);
+    CK_RV sign(const PrivateKey& key, const CertificateFacts& facts, ProofRequest& request,
+               Bytes& signature) const;
     Proof failed(CK_RV result, const std::string& what) const;
     PinState pinState() const;
 
@@ -42,6 +44,8 @@ private:
     const SlotToken& _slotToken;
     const TokenObjects& _objects;
     Token _token;
+    std::optional<Pkcs11Session> _session;
+    bool _isLoggedIn = false;
 };
 
 }  // namespace vlm::service

@@ -9,12 +9,13 @@ std::optional<CertificateObject> readCertificateObject(const Pkcs11Session& sess
                                                        CK_OBJECT_HANDLE object) {
     const Attributes attributes =
         session.read(object, {CKA_CERTIFICATE_TYPE, CKA_VALUE, CKA_ID, CKA_LABEL});
-    const auto der = attributes.bytes(CKA_VALUE);
+    auto der = attributes.bytes(CKA_VALUE);
     if (!der || attributes.number(CKA_CERTIFICATE_TYPE) != CK_ULONG{CKC_X_509}) return {};
     auto facts = readCertificate(*der);
     if (!facts) return {};
     return CertificateObject{attributes.bytes(CKA_ID).value_or(Bytes{}),
-                             cardText(attributes.text(CKA_LABEL)), std::move(*facts)};
+                             cardText(attributes.text(CKA_LABEL)), std::move(*facts),
+                             std::move(*der)};
 }
 
 bool readKeys(const Pkcs11Session& session, CK_OBJECT_CLASS objectClass, TokenObjects& objects) {
@@ -55,7 +56,7 @@ std::optional<KeyObject> readKey(const Pkcs11Session& session, CK_OBJECT_HANDLE 
                                  bool isPrivate) {
     const Attributes attributes =
         session.read(object, {CKA_KEY_TYPE, CKA_ID, CKA_MODULUS, CKA_EC_POINT, CKA_SIGN, CKA_VERIFY,
-                              CKA_DECRYPT, CKA_UNWRAP, CKA_ENCRYPT, CKA_WRAP, CKA_DERIVE});
+                              CKA_DECRYPT, CKA_ENCRYPT, CKA_DERIVE});
     const auto type = attributes.number(CKA_KEY_TYPE);
     const bool rsa = type == CK_ULONG{CKK_RSA};
     const bool ec = type == CK_ULONG{CKK_EC};
@@ -67,13 +68,17 @@ std::optional<KeyObject> readKey(const Pkcs11Session& session, CK_OBJECT_HANDLE 
     key.id = attributes.bytes(CKA_ID).value_or(Bytes{});
     key.publicPart = attributes.bytes(rsa ? CKA_MODULUS : CKA_EC_POINT).value_or(Bytes{});
     key.signs = attributes.flag(isPrivate ? CKA_SIGN : CKA_VERIFY);
-    if (!rsa)
-        key.wraps = attributes.flag(CKA_DERIVE);
-    else if (isPrivate)
-        key.wraps = attributes.flag(CKA_DECRYPT) || attributes.flag(CKA_UNWRAP);
-    else
-        key.wraps = attributes.flag(CKA_ENCRYPT) || attributes.flag(CKA_WRAP);
+    key.wraps = attributes.flag(!rsa ? CKA_DERIVE : isPrivate ? CKA_DECRYPT : CKA_ENCRYPT);
     return key;
+}
+
+WrapMechanisms wrapMechanismsIn(const Pkcs11Module& module, CK_SLOT_ID slot) {
+    const auto decrypts = [&](CK_MECHANISM_TYPE mechanism) {
+        return module.offers(slot, mechanism, CKF_DECRYPT);
+    };
+    return {.oaep = decrypts(CKM_RSA_PKCS_OAEP) || decrypts(CKM_RSA_X_509),
+            .pkcs1 = decrypts(CKM_RSA_PKCS),
+            .ecdh = module.offers(slot, CKM_ECDH1_DERIVE, CKF_DERIVE)};
 }
 
 std::optional<std::vector<CK_OBJECT_HANDLE>> findClass(const Pkcs11Session& session,

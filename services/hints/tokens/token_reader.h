@@ -20,6 +20,9 @@ PinState pinStateOf(CK_FLAGS tokenFlags);
 // itself cannot be read.
 std::optional<TokenObjects> readObjects(const Pkcs11Session& session);
 
+// What the token offers for opening what was wrapped.
+WrapMechanisms wrapMechanismsIn(const Pkcs11Module& module, CK_SLOT_ID slot);
+
 // One key object; none for a key that is neither RSA nor EC.
 std::optional<KeyObject> readKey(const Pkcs11Session& session, CK_OBJECT_HANDLE object,
                                  bool isPrivate);

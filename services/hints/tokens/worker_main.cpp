@@ -2,6 +2,10 @@
 // socket as descriptor 3; it serves that until the other side closes it.
 //
 //   vlm-token-worker LOOK-AGAIN-MILLISECONDS MODULE-PATH
+//   vlm-token-worker anchors MODULE-PATH
+//
+// In the second form the module is one that holds trust anchors: these are told, without a
+// question, and that is all.
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -12,6 +16,7 @@
 #include <string>
 
 #include "services/hints/closed_process.h"
+#include "services/hints/tokens/anchor_reader.h"
 #include "services/hints/tokens/card_module.h"
 #include "services/hints/tokens/frames.h"
 #include "services/hints/tokens/worker_protocol.h"
@@ -31,16 +36,16 @@ public:
         while (const auto message = readFrame(kSocket)) {
             auto request = decodeRequest(*message);
             if (!request) return;
-            std::optional<Bytes> answer;
+            bool answered = false;
             if (auto* proof = std::get_if<ProofRequest>(&*request)) {
                 auto pin = readSecretFrame(kSocket, kMostPinBytes);
                 if (!pin) return;
                 proof->pin = std::move(*pin);
-                answer = prove(std::move(*proof));
+                answered = prove(std::move(*proof));
             } else {
-                answer = list();
+                answered = write(list());
             }
-            if (!answer || !writeFrame(kSocket, *answer)) return;
+            if (!answered) return;
         }
     }
 
@@ -63,9 +68,18 @@ private:
         return encodeAnswer(answer);
     }
 
-    std::optional<Bytes> prove(ProofRequest request) {
-        if (const auto failed = load()) return encodeAnswer(*failed);
-        return encodeAnswer(_module->prove(std::move(request)));
+    bool prove(ProofRequest request) {
+        if (const auto failed = load()) return write(encodeAnswer(*failed));
+        bool told = false;
+        const auto opening = _module->prove(
+            std::move(request), [&told](const Proof& proof) { told = write(encodeAnswer(proof)); });
+        if (!told || !opening) return told;
+        return write(encodeAnswer(OpeningAnswer{opening->whyNot})) &&
+               writeFrame(kSocket, opening->opened.octets());
+    }
+
+    static bool write(const std::optional<Bytes>& answer) {
+        return answer && writeFrame(kSocket, *answer);
     }
 
     std::string _modulePath;
@@ -74,19 +88,32 @@ private:
     std::optional<std::vector<Token>> _told;  // what the other side knows
 };
 
-int run(int argc, char* argv[]) {
-    int milliseconds = 0;
-    const std::string_view number = argc == 3 ? argv[1] : "";
-    const char* end = number.data() + number.size();
+bool hasSocket() {
     struct stat status = {};
-    if (number.empty() || std::from_chars(number.data(), end, milliseconds).ptr != end ||
-        fstat(kSocket, &status) != 0 || !S_ISSOCK(status.st_mode)) {
+    return fstat(kSocket, &status) == 0 && S_ISSOCK(status.st_mode);
+}
+
+// False when the words are none that this program is started with.
+bool serve(std::string_view word, const std::string& modulePath) {
+    if (word == "anchors") {
+        if (const auto anchors = readAnchors(modulePath)) {
+            if (const auto message = encodeAnchors(*anchors)) writeFrame(kSocket, *message);
+        }
+        return true;
+    }
+    int milliseconds = 0;
+    const char* end = word.data() + word.size();
+    if (word.empty() || std::from_chars(word.data(), end, milliseconds).ptr != end) return false;
+    Worker(modulePath, std::chrono::milliseconds(milliseconds)).serve();
+    return true;
+}
+
+int run(int argc, char* argv[]) {
+    closeToOthers();
+    if (argc != 3 || !hasSocket() || !serve(argv[1], argv[2])) {
         std::cerr << "vlm-token-worker: it is started by the hints service, not by hand\n";
         return 2;
     }
-    closeToOthers();
-    Worker worker(argv[2], std::chrono::milliseconds(milliseconds));
-    worker.serve();
     // Nobody waits any more; a module that does not come to an end is cut short.
     alarm(kSecondsToLeave);
     return 0;

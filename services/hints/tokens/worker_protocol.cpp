@@ -3,8 +3,8 @@
 #include <algorithm>
 #include <utility>
 
-#include "platform/harmless_text.h"
 #include "platform/property_list.h"
+#include "services/hints/tokens/bounded_entries.h"
 #include "services/hints/tokens/card_text.h"
 #include "services/hints/tokens/frames.h"
 #include "services/hints/tokens/signature.h"
@@ -28,87 +28,30 @@ constexpr std::size_t kMostProblems = 64;
 constexpr std::size_t kMostReasonCharacters = 512;
 constexpr std::size_t kHashBytes = 32;
 
-// Reads entries of one dictionary; after an entry that is missing, of a wrong type or out of
-// bounds it has failed, and says so at the end, so that each entry needs no check of its own.
-class Entries {
-public:
-    explicit Entries(const PropertyList* value)
-        : _entries(value == nullptr ? nullptr : value->dictionary()),
-          _failed(_entries == nullptr) {}
-
-    bool failed() const { return _failed; }
-    bool has(std::string_view key) const { return _entries != nullptr && _entries->contains(key); }
-
-    std::string text(std::string_view key, std::size_t most) {
-        const PropertyList* value = find(key);
-        const std::string* text = value == nullptr ? nullptr : value->text();
-        if (text == nullptr || text->size() > most) return fail<std::string>();
-        return *text;
-    }
-    std::string cardText(std::string_view key, std::size_t characters) {
-        return vlm::service::cardText(text(key, characters * 4 + platform::kCutMark.size()),
-                                      characters);
-    }
-    Bytes bytes(std::string_view key, std::size_t least, std::size_t most) {
-        const PropertyList* value = find(key);
-        const Bytes* bytes = value == nullptr ? nullptr : value->bytes();
-        if (bytes == nullptr || bytes->size() < least || bytes->size() > most) return fail<Bytes>();
-        return *bytes;
-    }
-    bool boolean(std::string_view key) {
-        const PropertyList* value = find(key);
-        const auto boolean = value == nullptr ? std::nullopt : value->boolean();
-        return boolean ? *boolean : fail<bool>();
-    }
-    std::int64_t integer(std::string_view key) {
-        const PropertyList* value = find(key);
-        const auto integer = value == nullptr ? std::nullopt : value->integer();
-        return integer ? *integer : fail<std::int64_t>();
-    }
-    // One of an enumeration's values, which go from 0 to `last` without a gap.
-    template <typename Enumeration>
-    Enumeration oneOf(std::string_view key, Enumeration last) {
-        const std::int64_t number = integer(key);
-        if (number < 0 || number > static_cast<std::int64_t>(last)) return fail<Enumeration>();
-        return static_cast<Enumeration>(number);
-    }
-    const Array& array(std::string_view key, std::size_t most) {
-        static const Array kNone;
-        const PropertyList* value = find(key);
-        const Array* array = value == nullptr ? nullptr : value->array();
-        if (array != nullptr && array->size() <= most) return *array;
-        _failed = true;
-        return kNone;
-    }
-
-private:
-    const PropertyList* find(std::string_view key) const {
-        return _entries == nullptr ? nullptr : _entries->find(key);
-    }
-    template <typename Value>
-    Value fail() {
-        _failed = true;
-        return Value{};
-    }
-
-    const Dictionary* _entries;
-    bool _failed;
-};
-
 std::optional<Bytes> write(Dictionary message) {
     return platform::writeBinaryPropertyList(std::move(message), kLimits);
 }
 
-PropertyList encode(const Identity& identity) {
-    return Dictionary{{"key", identity.publicKeyInfo},
-                      {"name", identity.name},
-                      {"from", identity.notBefore},
-                      {"until", identity.notAfter},
-                      {"signs", identity.canSign}};
+enum class Certificates { Told, LeftOut };
+
+bool isTold(const Bytes& certificate, Certificates certificates) {
+    return certificates == Certificates::Told && !certificate.empty() &&
+           certificate.size() <= kMostCertificateBytes;
+}
+
+PropertyList encode(const Identity& identity, Certificates certificates) {
+    Dictionary dictionary{{"key", identity.publicKeyInfo},
+                          {"name", identity.name},
+                          {"from", identity.notBefore},
+                          {"until", identity.notAfter},
+                          {"signs", identity.canSign}};
+    if (isTold(identity.certificate, certificates))
+        dictionary.set("certificate", identity.certificate);
+    return dictionary;
 }
 
 std::optional<Identity> decodeIdentity(const PropertyList& value) {
-    Entries entries(&value);
+    BoundedEntries entries(&value);
     Identity identity;
     identity.publicKeyInfo = entries.bytes("key", 1, kMostKeyBytes);
     // The hash is made here, so that it is right whatever the worker is up to.
@@ -117,20 +60,33 @@ std::optional<Identity> decodeIdentity(const PropertyList& value) {
     identity.notBefore = entries.integer("from");
     identity.notAfter = entries.integer("until");
     identity.canSign = entries.boolean("signs");
+    if (entries.has("certificate"))
+        identity.certificate = entries.bytes("certificate", 1, kMostCertificateBytes);
     if (entries.failed()) return {};
     return identity;
 }
 
-PropertyList encode(const Token& token) {
+PropertyList encode(WrapScheme scheme) { return static_cast<std::int64_t>(scheme); }
+
+PropertyList encode(const Token& token, Certificates certificates) {
     Array identities;
-    for (const Identity& identity : token.identities) identities.push_back(encode(identity));
+    for (const Identity& identity : token.identities)
+        identities.push_back(encode(identity, certificates));
+    Array others;
+    for (const Bytes& other : token.otherCertificates)
+        if (isTold(other, certificates) && others.size() < kMostOtherCertificates)
+            others.emplace_back(other);
     Dictionary dictionary{{"id", token.identifier},
                           {"name", token.name},
                           {"pad", token.hasPinPad},
                           {"login", token.needsLogin},
                           {"pin", static_cast<std::int64_t>(token.pinState)},
                           {"identities", std::move(identities)}};
-    if (token.wrapKeyHash) dictionary.set("wrap", *token.wrapKeyHash);
+    if (!others.empty()) dictionary.set("others", std::move(others));
+    if (token.wrapKeyHash) {
+        dictionary.set("wrap", *token.wrapKeyHash);
+        dictionary.set("scheme", encode(token.wrapScheme));
+    }
     return dictionary;
 }
 
@@ -141,18 +97,27 @@ bool isIdentifier(const std::string& text) {
 }
 
 std::optional<Token> decodeToken(const PropertyList& value) {
-    Entries entries(&value);
+    BoundedEntries entries(&value);
     Token token;
     token.identifier = entries.text("id", kMostIdentifierBytes);
     token.name = entries.cardText("name", kCardTextLength);
     token.hasPinPad = entries.boolean("pad");
     token.needsLogin = entries.boolean("login");
-    token.pinState = entries.oneOf("pin", PinState::Locked);
-    if (entries.has("wrap")) token.wrapKeyHash = entries.bytes("wrap", kHashBytes, kHashBytes);
+    token.pinState = entries.oneOf("pin", PinState::Ready, PinState::Locked);
+    if (entries.has("wrap")) {
+        token.wrapKeyHash = entries.bytes("wrap", kHashBytes, kHashBytes);
+        token.wrapScheme = entries.oneOf("scheme", WrapScheme::RsaOaepSha256, WrapScheme::Ecdh);
+    }
     for (const PropertyList& each : entries.array("identities", kMostIdentities)) {
         auto identity = decodeIdentity(each);
         if (!identity) return {};
         token.identities.push_back(std::move(*identity));
+    }
+    if (entries.has("others")) {
+        for (const PropertyList& each : entries.array("others", kMostOtherCertificates)) {
+            if (each.bytes() == nullptr || each.bytes()->size() > kMostCertificateBytes) return {};
+            token.otherCertificates.push_back(*each.bytes());
+        }
     }
     if (entries.failed() || !isIdentifier(token.identifier)) return {};
     std::ranges::sort(token.identities, {}, &Identity::publicKeyHash);
@@ -163,7 +128,7 @@ std::optional<Token> decodeToken(const PropertyList& value) {
     return token;
 }
 
-std::optional<ListAnswer> decodeListAnswer(Entries entries) {
+std::optional<ListAnswer> decodeListAnswer(BoundedEntries entries) {
     ListAnswer answer;
     for (const PropertyList& each : entries.array("problems", kMostProblems)) {
         if (each.text() == nullptr) return {};
@@ -182,11 +147,11 @@ std::optional<ListAnswer> decodeListAnswer(Entries entries) {
     return answer;
 }
 
-std::optional<Proof> decodeProof(Entries entries) {
+std::optional<Proof> decodeProof(BoundedEntries entries) {
     Proof proof;
-    proof.outcome = entries.oneOf("outcome", Proof::Outcome::CardFailed);
+    proof.outcome = entries.oneOf("outcome", Proof::Outcome::Signed, Proof::Outcome::CardFailed);
     proof.signature = entries.bytes("signature", 0, kMostSignatureBytes);
-    proof.pinStateAfter = entries.oneOf("pin", PinState::Locked);
+    proof.pinStateAfter = entries.oneOf("pin", PinState::Ready, PinState::Locked);
     proof.reason = entries.cardText("reason", kMostReasonCharacters);
     if (entries.failed()) return {};
     return proof;
@@ -201,16 +166,25 @@ std::optional<Bytes> encodeProofRequest(const ProofRequest& request) {
         request.challenge.size() > kMostChallengeBytes ||
         request.publicKeyHash.size() != kHashBytes || request.pin.text().size() > kMostPinBytes)
         return {};
-    return write({{"op", "prove"},
-                  {"token", request.tokenIdentifier},
-                  {"hash", request.publicKeyHash},
-                  {"challenge", request.challenge}});
+    Dictionary message{{"op", "prove"},
+                       {"token", request.tokenIdentifier},
+                       {"hash", request.publicKeyHash},
+                       {"challenge", request.challenge}};
+    if (request.open) {
+        if (request.open->wrapKeyHash.size() != kHashBytes ||
+            request.open->sealed.size() > kMostSealedBytes)
+            return {};
+        message.set("wrap", request.open->wrapKeyHash);
+        message.set("scheme", encode(request.open->scheme));
+        message.set("sealed", request.open->sealed);
+    }
+    return write(std::move(message));
 }
 
 std::optional<std::variant<ListRequest, ProofRequest>> decodeRequest(
     std::span<const std::uint8_t> message) {
     const auto value = platform::readPropertyList(message, kLimits);
-    Entries entries(value ? &*value : nullptr);
+    BoundedEntries entries(value ? &*value : nullptr);
     const std::string operation = entries.text("op", 16);
     if (operation == "list") return ListRequest{};
     if (operation != "prove") return {};
@@ -218,21 +192,36 @@ std::optional<std::variant<ListRequest, ProofRequest>> decodeRequest(
     request.tokenIdentifier = entries.text("token", kMostIdentifierBytes);
     request.publicKeyHash = entries.bytes("hash", kHashBytes, kHashBytes);
     request.challenge = entries.bytes("challenge", 0, kMostChallengeBytes);
+    if (entries.has("wrap")) {
+        auto& open = request.open.emplace();
+        open.wrapKeyHash = entries.bytes("wrap", kHashBytes, kHashBytes);
+        open.scheme = entries.oneOf("scheme", WrapScheme::RsaOaepSha256, WrapScheme::Ecdh);
+        open.sealed = entries.bytes("sealed", 0, kMostSealedBytes);
+    }
     if (entries.failed()) return {};
     return request;
 }
 
-std::optional<Bytes> encodeAnswer(const ListAnswer& answer) {
+namespace {
+
+std::optional<Bytes> encodeWith(const ListAnswer& answer, Certificates certificates) {
     Array problems;
     for (const std::string& problem : answer.problems)
         if (problems.size() < kMostProblems) problems.emplace_back(problem);
     Dictionary message{{"problems", std::move(problems)}, {"silent", answer.announcesNothing}};
     if (answer.tokens) {
         Array tokens;
-        for (const Token& token : *answer.tokens) tokens.push_back(encode(token));
+        for (const Token& token : *answer.tokens) tokens.push_back(encode(token, certificates));
         message.set("tokens", std::move(tokens));
     }
     return write(std::move(message));
+}
+
+}  // namespace
+
+std::optional<Bytes> encodeAnswer(const ListAnswer& answer) {
+    auto whole = encodeWith(answer, Certificates::Told);
+    return whole ? std::move(whole) : encodeWith(answer, Certificates::LeftOut);
 }
 
 std::optional<Bytes> encodeAnswer(const Proof& answer) {
@@ -242,16 +231,24 @@ std::optional<Bytes> encodeAnswer(const Proof& answer) {
                   {"reason", answer.reason}});
 }
 
+std::optional<Bytes> encodeAnswer(const OpeningAnswer& answer) {
+    return write({{"unopened", answer.whyNot}});
+}
+
 std::optional<Bytes> encodeAnswer(const FailedAnswer& answer) {
     return write({{"failed", answer.reason}});
 }
 
-std::optional<std::variant<ListAnswer, Proof, FailedAnswer>> decodeAnswer(
-    std::span<const std::uint8_t> message) {
+std::optional<Answer> decodeAnswer(std::span<const std::uint8_t> message) {
     const auto value = platform::readPropertyList(message, kLimits);
-    Entries entries(value ? &*value : nullptr);
+    BoundedEntries entries(value ? &*value : nullptr);
     if (entries.has("failed")) {
         FailedAnswer answer{entries.cardText("failed", kMostReasonCharacters)};
+        if (entries.failed()) return {};
+        return answer;
+    }
+    if (entries.has("unopened")) {
+        OpeningAnswer answer{entries.cardText("unopened", kMostReasonCharacters)};
         if (entries.failed()) return {};
         return answer;
     }

@@ -20,7 +20,8 @@ protected:
         ASSERT_TRUE(opened) << opened.refusal().text;
         connection = std::move(*opened);
         server =
-            std::make_unique<BusServer>(connection->get(), kHintsInterface, "Exchange", exchanges);
+            std::make_unique<BusServer>(connection->get(), kHintsInterface,
+                                        std::vector<BusServer::Method>{{"Exchange", exchanges}});
         ASSERT_TRUE(server->start());
         ASSERT_EQ(connection->claim(kDaemonName), "");
     }

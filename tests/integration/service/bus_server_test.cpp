@@ -30,8 +30,8 @@ protected:
 
     PatientExchanges exchanges;
     platform::SdBus serverBus = connect();
-    std::unique_ptr<BusServer> server =
-        std::make_unique<BusServer>(serverBus.get(), kHintsInterface, "Exchange", exchanges);
+    std::unique_ptr<BusServer> server = std::make_unique<BusServer>(
+        serverBus.get(), kHintsInterface, std::vector<BusServer::Method>{{"Exchange", exchanges}});
 };
 
 TEST_F(BusServerTest, TellsWhoCallsFromWhatTheBusSays) {

@@ -42,7 +42,8 @@ protected:
     void registerInstance() {
         instanceBus = connectAsConsoleUser();
         instance =
-            std::make_unique<BusServer>(instanceBus.get(), kPrompterInterface, "AskPin", exchanges);
+            std::make_unique<BusServer>(instanceBus.get(), kPrompterInterface,
+                                        std::vector<BusServer::Method>{{"AskPin", exchanges}});
         ASSERT_TRUE(instance->start());
         ASSERT_GE(sd_bus_call_method_async(
                       instanceBus.get(), nullptr, nameOf(daemonBus.get()).c_str(), kObjectPath,

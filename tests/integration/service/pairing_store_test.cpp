@@ -14,6 +14,7 @@
 
 #include "cards.h"
 #include "fake_pairing_store.h"
+#include "private_folder.h"
 #include "services/hints/sqlite_pairing_store.h"
 #include "services/hints/status.h"
 
@@ -21,25 +22,6 @@ namespace vlm::service {
 namespace {
 
 using testing::HasSubstr;
-
-// A folder of a test's own that only this user may enter.
-class PrivateFolder {
-public:
-    PrivateFolder() {
-        std::string name = std::filesystem::temp_directory_path() / "vlm-store-XXXXXX";
-        if (mkdtemp(name.data())) _path = name;
-    }
-    PrivateFolder(const PrivateFolder&) = delete;
-    PrivateFolder& operator=(const PrivateFolder&) = delete;
-    ~PrivateFolder() {
-        std::error_code ignored;
-        if (!_path.empty()) std::filesystem::remove_all(_path, ignored);
-    }
-    const std::filesystem::path& path() const { return _path; }
-
-private:
-    std::filesystem::path _path;
-};
 
 template <typename Store>
 class PairingStoreContract;
@@ -235,7 +217,7 @@ TEST_F(SqlitePairingStoreTest, MarksTheDatabaseAsItsOwn) {
     SQLite::Database other(path(), SQLite::OPEN_READONLY);
 
     EXPECT_EQ(other.execAndGet("PRAGMA application_id").getInt(), 0x766C6D70);
-    EXPECT_EQ(other.execAndGet("PRAGMA user_version").getInt(), 1);
+    EXPECT_EQ(other.execAndGet("PRAGMA user_version").getInt(), 2);
 }
 
 TEST_F(SqlitePairingStoreTest, RefusesASchemaThatIsNewerThanItself) {

@@ -34,7 +34,8 @@ protected:
     ~SessionTokensTest() override { unsetenv("PCSCLITE_CSOCK_NAME"); }
 
     void beginSession() {
-        tokens.emplace(SessionTokens::Parts{event(), connection.get(), callers, daemon});
+        tokens.emplace(SessionTokens::Parts{event(), connection.get(), callers, daemon,
+                                            [](const std::string&) {}});
         EXPECT_TRUE(tokens->start());
     }
 

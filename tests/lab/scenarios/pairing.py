@@ -47,6 +47,7 @@ def a_card_is_paired_with_nothing_started_by_hand(lab):
     check.assertIn(f"{hash_}\talice - {ALICE}\n", listed)
     check.assertEqual(len(lab.asked("polkit")), 1)
     check.assertEqual(len(lab.asked("pinentry")), 1)
+    check.assertEqual(len(lab.asked("keyring")), 1)
     check_said(lab, "finishWithResult: result: 0", "vlm bind succeeded")
     lab.wait_until("the daemon has left", lambda: not runs(lab))
     check.assertEqual(_running(lab), ["alice vlmhintsd"])
@@ -54,6 +55,7 @@ def a_card_is_paired_with_nothing_started_by_hand(lab):
 
 def the_pairing_stands_before_its_alert_is_dismissed(lab):
     agree(lab)
+    lab.answer("keyring", "dismiss")
     click_pair(lab)
 
     shown = wait_for_alert(lab)
@@ -66,6 +68,7 @@ def the_pairing_stands_before_its_alert_is_dismissed(lab):
 
 def a_card_pulled_under_the_alert_takes_it_along_and_stays_paired(lab):
     agree(lab)
+    lab.answer("keyring", "dismiss")
     click_pair(lab)
     wait_for_alert(lab)
 

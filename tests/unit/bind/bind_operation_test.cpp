@@ -103,22 +103,5 @@ TEST(BindResult, HasTheNumbersThatCallersKnow) {
     EXPECT_EQ(static_cast<int>(BindResult::NotOffered), 3);
 }
 
-class StoreUnlockKey : public BindOperationTest {};
-
-TEST_F(StoreUnlockKey, SaysThatThisVersionCannotDoIt) {
-    std::optional<platform::Error> error;
-
-    EXPECT_EQ(operation->storeUnlockKey(blueSigning, &error), -8);
-
-    ASSERT_TRUE(error);
-    EXPECT_EQ(error->domain, "VLErrorDomain");
-    EXPECT_EQ(error->code, -8);
-    EXPECT_EQ(error->localizedDescription, "This version cannot store an unlock key yet.");
-}
-
-TEST_F(StoreUnlockKey, NeedsNoPlaceForAnError) {
-    EXPECT_EQ(operation->storeUnlockKey(blueSigning, nullptr), -8);
-}
-
 }  // namespace
 }  // namespace vlm

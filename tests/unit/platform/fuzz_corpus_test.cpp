@@ -1,30 +1,11 @@
-// The fuzzers' corpora, which hold every input that ever showed a fault, in the ordinary tests.
+#include "tests/unit/fuzz_corpus.h"
 
 #include <gtest/gtest.h>
-
-#include <filesystem>
-#include <fstream>
-#include <iterator>
 
 #include "fuzz/properties.h"
 
 namespace vlm::fuzz {
 namespace {
-
-struct Seed {
-    std::string name;
-    platform::Bytes data;
-};
-
-std::vector<Seed> corpus(const char* folder) {
-    std::vector<Seed> seeds;
-    for (const auto& entry :
-         std::filesystem::directory_iterator(std::filesystem::path(VLM_FUZZ_CORPUS) / folder)) {
-        std::ifstream file(entry.path(), std::ios::binary);
-        seeds.push_back({entry.path().filename(), {std::istreambuf_iterator(file), {}}});
-    }
-    return seeds;
-}
 
 TEST(FuzzCorpusTest, HoldsWhatEachPropertySays) {
     struct {

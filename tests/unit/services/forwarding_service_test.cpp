@@ -5,6 +5,7 @@
 #include "cards.h"
 #include "fake_caller_watch.h"
 #include "fake_daemon_link.h"
+#include "fake_login_keyring.h"
 #include "platform/token_framework.h"
 #include "platform_test.h"
 #include "services/hints/reply.h"
@@ -15,7 +16,10 @@ namespace {
 
 class ForwardingServiceTest : public fakes::PlatformTest {
 protected:
-    ForwardingServiceTest() { accounts().add("alice", 1000); }
+    ForwardingServiceTest() {
+        accounts().add("alice", 1000);
+        process().runAs(1000, "alice");
+    }
 
     void ask(const IncomingRequest& request) {
         service.handle(alice, request,
@@ -31,7 +35,8 @@ protected:
     const Caller alice{1000, 20, ":1.20"};
     fakes::FakeDaemonLink daemon;
     fakes::FakeCallerWatch callers;
-    ForwardingService service{daemon, callers};
+    fakes::FakeLoginKeyring keyring;
+    ForwardingService service{daemon, keyring, callers};
     std::vector<platform::Message> replies;
 };
 
@@ -53,6 +58,10 @@ TEST_F(ForwardingServiceTest, PassesTheRequestOnAsItIsAndTheAnswerBack) {
     EXPECT_EQ(callers.watching(), 0u);
 }
 
+IncomingRequest unlock(const std::string& password) {
+    return requestOf(5, {{"uid", signedNumber(1000)}, {"str1", text(password)}});
+}
+
 struct Rule {
     const char* why;
     IncomingRequest request;
@@ -63,7 +72,8 @@ TEST_F(ForwardingServiceTest, PassesOnWhatAUserMayAskAndRefusesTheRest) {
     const Rule rules[] = {
         {"a login", ownLogin(), 0},
         {"a listing", requestOf(1, {{"uid", signedNumber(-1)}}), 0},
-        {"a key bag", requestOf(5, {{"uid", signedNumber(1000)}, {"str1", "x"}}), 0},
+        {"another's keyring", requestOf(5, {{"uid", signedNumber(1001)}, {"str1", "x"}}),
+         status::kNotPermitted},
         {"a listing for another", requestOf(1, {{"uid", signedNumber(1001)}}),
          status::kNotPermitted},
         {"a pairing", requestOf(2, {{"dat1", hashOf(1)}, {"str1", "alice"}}), status::kNotServed},
@@ -93,6 +103,47 @@ TEST_F(ForwardingServiceTest, PassesOnWhatAUserMayAskAndRefusesTheRest) {
         EXPECT_EQ(errorText().find("org.vlm.token.hints.daemon") != std::string::npos,
                   expected == status::kNotServed);
     }
+}
+
+TEST_F(ForwardingServiceTest, UnlocksTheKeyringOfItsUserItself) {
+    keyring.makeOne("open sesame");
+
+    ask(unlock("open sesame"));
+    EXPECT_TRUE(replies.empty());
+    keyring.settle();
+
+    ASSERT_EQ(replies.size(), 1u);
+    EXPECT_EQ(replies[0], numberReply(0));
+    EXPECT_TRUE(daemon.requests.empty());
+    EXPECT_EQ(callers.watching(), 0u);
+}
+
+TEST_F(ForwardingServiceTest, SaysWhyTheKeyringWasNotUnlocked) {
+    keyring.makeOne("open sesame");
+
+    ask(unlock("wrong"));
+    keyring.settle();
+
+    EXPECT_EQ(replies.at(0).integer("res"), status::kKeyringRefused);
+    EXPECT_EQ(errorText(), "Unlocking a login keyring: the login keyring refused the password.");
+}
+
+TEST_F(ForwardingServiceTest, LeavesAnotherUsersKeyringToTheDaemon) {
+    const Caller root{0, 30, ":1.30"};
+    service.handle(root, requestOf(5, {{"uid", signedNumber(1001)}, {"str1", "x"}}),
+                   [](const platform::Message&) {});
+
+    EXPECT_EQ(daemon.requests.size(), 1u);
+    EXPECT_EQ(keyring.open(), 0u);
+}
+
+TEST_F(ForwardingServiceTest, GivesUpTheUnlockingWhenItsCallerLeaves) {
+    ask(unlock("open sesame"));
+    ASSERT_EQ(keyring.open(), 1u);
+
+    callers.leave(alice.connection);
+
+    EXPECT_EQ(keyring.open(), 0u);
 }
 
 TEST_F(ForwardingServiceTest, SaysSoWhenTheDaemonDoesNotAnswer) {

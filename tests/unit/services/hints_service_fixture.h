@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -14,11 +15,13 @@
 #include "fake_pairing_store.h"
 #include "fake_pin_prompt.h"
 #include "fake_tokens.h"
+#include "fake_user_keyrings.h"
 #include "platform/property_list.h"
 #include "platform/token_framework.h"
 #include "platform_test.h"
 #include "services/hints/hints_service.h"
 #include "services/hints/status.h"
+#include "tests/integration/linux/temporary_folder.h"
 
 namespace vlm::service {
 
@@ -93,8 +96,14 @@ protected:
     fakes::FakeCallerWatch callers;
     fakes::FakeCallerSessions sessions;
     fakes::FakeAuthority authority;
+    fakes::FakeUserKeyrings keyrings;
     Proofs proofs{[this] { return now; }};
     AdministratorRight right{authority};
+    test::TemporaryFolder folder;
+    SessionCards sessionCards{folder.path() / "vlm" / "sessions"};
+    std::set<std::string> openSessions;
+    SessionLogin sessionLogin{sessionCards,
+                              [this](const auto& name) { return openSessions.contains(name); }};
     std::uint8_t lastRandom = 0;
     HintsService service{{
         .login = {
@@ -104,6 +113,8 @@ protected:
             },
             [this](std::size_t size) { return std::optional(Bytes(size, ++lastRandom)); }},
         .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
+        .unlockKeys = {tokens, pairings, pairings, keyrings},
+        .sessionLogin = sessionLogin,
         .callers = callers,
     }};
 

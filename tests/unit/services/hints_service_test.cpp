@@ -35,12 +35,9 @@ TEST_F(HintsServiceTest, LogsUnderTheCategoryHints) {
     EXPECT_EQ(log().lines()[0].subsystem, "org.vlm.token");
 }
 
-TEST_F(HintsServiceTest, ServesNoKeyBagsAndNoEndpoints) {
-    const auto keyBag = ask(root(), requestOf(5, {{"uid", signedNumber(1000)}, {"str1", "x"}}));
+TEST_F(HintsServiceTest, ServesNoEndpoints) {
     const auto endpoints = ask(root(), requestOf(7, {{"uid", signedNumber(1000)}}));
 
-    EXPECT_EQ(result(keyBag), status::kNotServed);
-    EXPECT_THAT(errorText(keyBag), HasSubstr("key bag"));
     EXPECT_EQ(result(endpoints), status::kNotServed);
     EXPECT_NE(errorText(endpoints), "(no error)");
 }
@@ -324,6 +321,8 @@ TEST_F(HintsServiceTest, LetsGoOfAnswersThatComeAfterItIsGone) {
         HintsService shortLived{
             {.login = {cards, prompt, {}, {}},
              .changes = {cards, pairings, proofs, sessions, right, [] { return kNow; }},
+             .unlockKeys = {tokens, pairings, pairings, keyrings},
+             .sessionLogin = sessionLogin,
              .callers = callers}};
         const auto count = [&](const platform::Message&) { ++replies; };
         shortLived.handle(root(), requestOf(1, {{"uid", signedNumber(-1)}}), count);

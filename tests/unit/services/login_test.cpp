@@ -287,6 +287,8 @@ TEST_F(LoginTest, GivesTheCardNoPinWhenThereIsNothingToChallengeItWith) {
     cards.insert(tokenOf("pkcs11:token=a", "PIV Card", {identityOf(1, "Alice")}));
     HintsService poor{{.login = {cards, prompt, {}, [](std::size_t) { return std::nullopt; }},
                        .changes = {tokens, pairings, proofs, sessions, right, [] { return kNow; }},
+                       .unlockKeys = {tokens, pairings, pairings, keyrings},
+                       .sessionLogin = sessionLogin,
                        .callers = callers}};
     platform::Message reply;
 

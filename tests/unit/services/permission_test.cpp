@@ -64,6 +64,16 @@ constexpr Rule kRules[] = {
     {"ask whether nobody known is paired", Operation::IsPaired, "mallory", kNobody, false},
     {"watch her own cards", Operation::TokenEndpoints, "", kAlice, true},
     {"watch the cards of bob", Operation::TokenEndpoints, "", 1001, false},
+    {"name her own keyring", Operation::NameKeyring, "", kAlice, true},
+    {"name the keyring of bob", Operation::NameKeyring, "", 1001, false},
+    {"store her own unlock key", Operation::StoreUnlockKey, "", kAlice, true},
+    {"store an unlock key of bob", Operation::StoreUnlockKey, "", 1001, false},
+    {"erase her own unlock key", Operation::EraseUnlockKey, "alice", kNobody, true},
+    {"erase an unlock key of bob", Operation::EraseUnlockKey, "bob", kNobody, false},
+    {"erase one of nobody known", Operation::EraseUnlockKey, "mallory", kNobody, false},
+    {"tell of her own new password", Operation::PasswordChanged, "alice", kNobody, true},
+    {"tell of a new password of bob", Operation::PasswordChanged, "bob", kNobody, false},
+    {"tell of one of nobody known", Operation::PasswordChanged, "mallory", kNobody, false},
 };
 
 TEST_F(PermissionTest, LetsRootDoAllAndOthersWhatConcernsThemselves) {

@@ -15,8 +15,13 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
 
-PinQuestion question(PinState state = PinState::Ready) {
-    return {"PIV Card", "Alice", state, "alice", {}};
+PinentryForm question(PinState state = PinState::Ready) {
+    return pinForm({"PIV Card", "Alice", state, "alice", {}});
+}
+PinentryForm passwordTwice() {
+    PasswordQuestion question{"PIV Card", "alice"};
+    question.isTypedTwice = true;
+    return passwordForm(question);
 }
 
 // Everything that we say to a program that answers OK to all of it, up to the request for the PIN.
@@ -52,9 +57,7 @@ TEST(PinentryDialogTest, NamesNoTerminalOnADesktop) {
 }
 
 TEST(PinentryDialogTest, NamesNoAccountWhereItMayBeAny) {
-    auto ofRoot = question();
-    ofRoot.account.clear();
-    PinentryDialog dialog(ofRoot, std::nullopt);
+    PinentryDialog dialog(pinForm({"PIV Card", "Alice", PinState::Ready, "", {}}), std::nullopt);
 
     EXPECT_THAT(sayAll(dialog), Contains(HasSubstr("can be paired with an account.\n")));
 }
@@ -109,12 +112,12 @@ TEST(PinentryDialogTest, AsksForNoPinWithoutAYesToTheLastTry) {
 }
 
 TEST(PinentryDialogTest, LetsNoNameSpeakForIt) {
-    PinQuestion hostile = question();
-    hostile.card = "A\nGETPIN 100%25\r";
-    hostile.identity = std::string(5000, 'x');
-    hostile.account = std::string(5000, 'y');
-    hostile.state = PinState::LastTry;
-    PinentryDialog dialog(hostile, PinentryTerminal{"/dev/pts/3\nBYE", "xterm"});
+    const PinQuestion hostile{"A\nGETPIN 100%25\r",
+                              std::string(5000, 'x'),
+                              PinState::LastTry,
+                              std::string(5000, 'y'),
+                              {}};
+    PinentryDialog dialog(pinForm(hostile), PinentryTerminal{"/dev/pts/3\nBYE", "xterm"});
 
     for (const auto& line : sayAll(dialog)) {
         EXPECT_LE(line.size(), 1000u);
@@ -171,6 +174,75 @@ TEST(PinentryDialogTest, TakesTheLongestPin) {
     dialog.take("OK");
 
     EXPECT_EQ(dialog.takeAnswer().pin.text().size(), 256u);
+}
+
+TEST(PinentryDialogTest, AsksForThePasswordOfAKeyringAndNamesCardAndAccount) {
+    PinentryDialog dialog(passwordForm({"PIV Card", "alice"}), std::nullopt);
+
+    EXPECT_THAT(
+        sayAll(dialog),
+        ElementsAre("OPTION lc-ctype=C.UTF-8\n", "SETTIMEOUT 600\n", "SETTITLE Login keyring\n",
+                    "SETDESC Enter the password of your login keyring, once, so that the "
+                    "card \"PIV Card\" can open it from now on when alice logs in with "
+                    "it. As a rule it is your login password.\n",
+                    "SETPROMPT Password:\n", "GETPIN\n"));
+}
+
+TEST(PinentryDialogTest, SaysThatThePasswordBeforeWasWrong) {
+    PasswordQuestion again{"PIV Card", "alice"};
+    again.wasRefused = true;
+    PinentryDialog dialog(passwordForm(again), std::nullopt);
+
+    EXPECT_THAT(sayAll(dialog),
+                Contains("SETERROR This password does not open your login keyring.\n"));
+}
+
+TEST(PinentryDialogTest, LetsAPasswordThatNothingChecksBeTypedTwice) {
+    PinentryDialog dialog(passwordTwice(), std::nullopt);
+
+    const auto said = sayAll(dialog);
+    EXPECT_THAT(said, Contains("SETREPEAT Again:\n"));
+    EXPECT_THAT(said, Contains(HasSubstr("asked for twice")));
+
+    dialog.take("D secret");
+    dialog.take("S PIN_REPEATED");
+    dialog.take("OK");
+    EXPECT_EQ(dialog.takeAnswer().pin.text(), "secret");
+}
+
+TEST(PinentryDialogTest, TakesNoPasswordFromAProgramThatCannotAskTwice) {
+    PinentryDialog dialog(passwordTwice(), std::nullopt);
+    sayAll(dialog);
+
+    dialog.take("D secret");
+    dialog.take("OK");
+
+    const auto answer = dialog.takeAnswer();
+    EXPECT_EQ(answer.outcome, Outcome::Unavailable);
+    EXPECT_TRUE(answer.pin.empty());
+    EXPECT_THAT(answer.reason, HasSubstr("does not ask twice"));
+}
+
+TEST(PinentryDialogTest, TakesAPasswordThatIsLongerThanAnyPin) {
+    PinentryDialog dialog(passwordForm({"PIV Card", "alice"}), std::nullopt);
+    sayAll(dialog);
+
+    dialog.take("D " + std::string(900, 'x'));
+    dialog.take("D " + std::string(124, 'y'));
+    dialog.take("OK");
+
+    EXPECT_EQ(dialog.takeAnswer().pin.text().size(), 1024u);
+}
+
+TEST(PinentryDialogTest, TakesNoPasswordThatIsTooLong) {
+    PinentryDialog dialog(passwordForm({"PIV Card", "alice"}), std::nullopt);
+    sayAll(dialog);
+
+    dialog.take("D " + std::string(900, 'x'));
+    dialog.take("D " + std::string(125, 'y'));
+    dialog.take("OK");
+
+    EXPECT_EQ(dialog.takeAnswer().outcome, Outcome::Unavailable);
 }
 
 TEST(PinentryDialogTest, AsksAlsoWhenTheProgramKnowsNoneOfItsWishes) {

@@ -5,6 +5,7 @@
 
 #include "cards.h"
 #include "platform/property_list.h"
+#include "services/hints/secret_pipe.h"
 #include "services/hints/status.h"
 
 namespace vlm::service {
@@ -79,6 +80,48 @@ TEST(RequestTest, PassesOverKeysThatItDoesNotKnow) {
     EXPECT_TRUE(readRequest(incoming));
 }
 
+IncomingRequest storing(const platform::Message::Entry& changed = {"str3", text("")}) {
+    auto request = requestOf(9, {{"uid", signedNumber(1000)},
+                                 {"dat1", hashOf(1)},
+                                 {"dat2", hashOf(2)},
+                                 {"str1", text("pkcs11:token=a")},
+                                 {"str2", text("/keyring")}});
+    request.message.set(changed.first, changed.second);
+    return request;
+}
+
+TEST(RequestTest, ReadsTheStoringOfAnUnlockKey) {
+    const auto request = readRequest(storing());
+
+    ASSERT_TRUE(request);
+    EXPECT_EQ(request->operation, Operation::StoreUnlockKey);
+    EXPECT_EQ(request->user, 1000u);
+    EXPECT_EQ(request->hash, hashOf(1));
+    EXPECT_EQ(request->wrapKeyHash, hashOf(2));
+    EXPECT_EQ(request->tokenIdentifier, "pkcs11:token=a");
+    EXPECT_EQ(request->keyring, "/keyring");
+}
+
+TEST(RequestTest, ReadsANewPasswordFromItsPipe) {
+    const auto request = readRequest(
+        requestOf(13, {{"str1", text("alice")}, {"dat1", *pipeHolding(Secret("sesame"))}}));
+
+    ASSERT_TRUE(request);
+    EXPECT_EQ(request->account, "alice");
+    EXPECT_EQ(request->password->text(), "sesame");
+}
+
+TEST(RequestTest, SaysWhatItAsksForWithoutItsSecrets) {
+    for (const auto& incoming :
+         {requestOf(13, {{"str1", text("alice")}, {"dat1", *pipeHolding(Secret("sesame"))}}),
+          requestOf(5, {{"uid", signedNumber(1000)}, {"str1", text("sesame")}})}) {
+        const auto request = readRequest(incoming);
+        ASSERT_TRUE(request);
+        EXPECT_FALSE(describe(*request).empty());
+        EXPECT_THAT(describe(*request), testing::Not(HasSubstr("sesame")));
+    }
+}
+
 struct Hostile {
     const char* why;
     IncomingRequest request;
@@ -103,7 +146,23 @@ std::vector<Hostile> hostileRequests() {
     deep = PropertyList::Dictionary{{"tokid", "t"}, {"more", deep}};
     return {
         {"no operation", {}, "\"op\""},
-        {"an operation that does not exist", requestOf(8), "\"op\""},
+        {"an operation that does not exist", requestOf(99), "\"op\""},
+        {"a storing without a wrap key", storing({"dat2", text("x")}), "\"dat2\""},
+        {"a short wrap key's hash", storing({"dat2", Bytes(31)}), "\"dat2\""},
+        {"a storing without a token", storing({"str1", text("")}), "\"str1\""},
+        {"a storing without a keyring", storing({"str2", text("")}), "\"str2\""},
+        {"a storing with a text that is none", storing({"str3", Bytes(1)}), "\"str3\""},
+        {"a storing with a long text", storing({"str3", text(std::string(4097, 'x'))}), "\"str3\""},
+        {"an erasing without a hash", requestOf(10, {{"str1", text("alice")}}), "\"dat1\""},
+        {"a new password as text",
+         requestOf(13, {{"str1", text("alice")}, {"dat1", text("secret")}}), "\"dat1\""},
+        {"a new password that is too long",
+         requestOf(
+             13, {{"str1", text("alice")}, {"dat1", *pipeHolding(Secret(std::string(1025, 'x')))}}),
+         "\"dat1\""},
+        {"no new password", requestOf(13, {{"str1", text("alice")}}), "\"dat1\""},
+        {"a keyring's password that is too long",
+         requestOf(5, {{"uid", uid}, {"str1", text(std::string(1025, 'x'))}}), "\"str1\""},
         {"an absurd operation", requestOf(UINT64_MAX), "\"op\""},
         {"a signed operation", requestOf(1, {{"op", signedNumber(1)}}), "\"op\""},
         {"an operation as text", requestOf(1, {{"op", text("1")}}), "\"op\""},

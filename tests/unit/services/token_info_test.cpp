@@ -90,6 +90,18 @@ TEST(TokenInfoTest, OffersOnlyWhatLoginWouldAccept) {
     }
 }
 
+TEST(TokenInfoTest, UsesNoDistrustedIdentityForAuthenticationAndOffersItAllTheSame) {
+    auto identity = identityOf(1, "Alice");
+    identity.distrust = "it has been revoked";
+
+    const auto record = recordFor({tokenOf("a", "A", {identity})}, {});
+    const auto paired = recordFor({tokenOf("a", "A", {identity})}, {pairing("alice", 1, 1)});
+
+    EXPECT_EQ(entry(record, "unk"), PropertyList(Array{hashOf(1)}));
+    EXPECT_EQ(entry(paired, "hsh"), PropertyList(Dictionary{}));
+    EXPECT_EQ(entry(paired, "hsk"), PropertyList(Array{hashOf(1)}));
+}
+
 TEST(TokenInfoTest, OffersNothingThatIsPairedWithAnyAccount) {
     const auto record = recordFor({tokenOf("a", "A", {identityOf(1, "Alice")})},
                                   {pairing("bob", 1, 1)}, {.onlyAccount = "alice"});

@@ -43,9 +43,11 @@ struct SettingCase {
 
 inline const std::vector<SettingCase>& settingCases() {
     static const std::vector<SettingCase> cases = {
-        {"allowSmartCard", 1, true},        {"UserPairing", 1, true}, {"oneCardPerUser", 0, true},
-        {"checkCertificateTrust", 0, true}, {"useLocalOd", 0, true},  {"enforceSmartCard", 0, true},
-        {"allowUnmappedUsers", 0, false},   {"anyOtherKey", 0, true},
+        {"allowSmartCard", 1, true},      {"UserPairing", 1, true},
+        {"oneCardPerUser", 0, true},      {"checkCertificateTrust", 0, true},
+        {"useLocalOd", 0, true},          {"enforceSmartCard", 0, true},
+        {"allowUnmappedUsers", 0, false}, {"anyOtherKey", 0, true},
+        {"tokenRemovalAction", 0, true},
     };
     return cases;
 }

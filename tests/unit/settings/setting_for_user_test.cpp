@@ -3,6 +3,7 @@
 #include <optional>
 
 #include "fake_hints_service.h"
+#include "hints/hints_client.h"
 #include "settings/smartcard_settings.h"
 #include "settings/smartcard_settings_worker.h"
 #include "settings_fixture.h"
@@ -38,7 +39,7 @@ protected:
     }
 
     std::int32_t enforced(const std::optional<String>& user) {
-        return settingForUser("enforceSmartCard", user, file);
+        return settingForUser("enforceSmartCard", user, file, VLIsUserBound);
     }
 
     int questions() { return service.requests[Service::kIsUserBound]; }
@@ -148,6 +149,16 @@ TEST_F(SettingForUser, EnforcesACardWhileTheServiceGivesNoAnswer) {
     EXPECT_EQ(enforced("bob"), 1);
 }
 
+TEST_F(SettingForUser, AsksNobodyButWhomItIsTold) {
+    enforceForMappedUsersOnly();
+    const auto onlyBob = [](const std::optional<String>& user) { return user == String("bob"); };
+
+    EXPECT_EQ(settingForUser("enforceSmartCard", "bob", file, onlyBob), 1);
+    EXPECT_EQ(settingForUser("enforceSmartCard", "alice", file, onlyBob), 0);
+
+    EXPECT_EQ(ipc().connections, 0);
+}
+
 TEST_F(SettingForUser, IsTheMachinesSettingForEveryOtherKey) {
     setForMachine("allowUnmappedUsers", 1);
     for (const char* key :
@@ -155,8 +166,8 @@ TEST_F(SettingForUser, IsTheMachinesSettingForEveryOtherKey) {
         SCOPED_TRACE(key);
         setForMachine(key, 3);
 
-        EXPECT_EQ(settingForUser(key, "bob", file), 3);
-        EXPECT_EQ(settingForUser(key, std::nullopt, file), 3);
+        EXPECT_EQ(settingForUser(key, "bob", file, VLIsUserBound), 3);
+        EXPECT_EQ(settingForUser(key, std::nullopt, file, VLIsUserBound), 3);
     }
     EXPECT_EQ(questions(), 0);
 }

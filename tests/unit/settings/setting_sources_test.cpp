@@ -38,7 +38,7 @@ TEST_F(SettingSources, DecideAsTheRulesSayInEveryCombination) {
                     ++combinations;
                 }
 
-    EXPECT_EQ(combinations, 8 * 9 * 9 * 9);
+    EXPECT_EQ(combinations, 9 * 9 * 9 * 9);
 }
 
 }  // namespace

@@ -10,6 +10,8 @@ protected:
     void SetUp() override {
         ToolTest::SetUp();
         runAsRoot();
+        accounts().add("alice", 1000);
+        sessions().login(1000, /*onConsole=*/true);
         insertBlue();
     }
 
@@ -17,6 +19,11 @@ protected:
         Texts arguments{"-p", "-u", "alice", "-h", "B1"};
         arguments.insert(arguments.end(), more.begin(), more.end());
         return vlmbind(arguments);
+    }
+    static Texts warningWith(const std::string& why) {
+        return {"Failed to store Login keychain unlock key. " + why,
+                "User was successfully paired (public key hash: B1) but user password will be "
+                "required after next SmartCard login to unlock Login keychain."};
     }
 };
 
@@ -52,16 +59,15 @@ TEST_F(PairCommand, RequiresNoWrapKey) {
 TEST_F(PairCommand, StoresTheUnlockKeyForTheSameHash) {
     pair();
 
-    EXPECT_EQ(fakes::unlockKey().asked, (std::vector<std::optional<platform::Bytes>>{blueSigning}));
+    ASSERT_EQ(keychain().stored.size(), 1U);
+    EXPECT_EQ(keychain().stored[0].hash, blueSigning);
 }
 
 TEST_F(PairCommand, PrintsAWarningAndStillSucceedsWhenTheUnlockKeyIsNotStored) {
-    fakes::unlockKey().status = -8;
-    fakes::unlockKey().error = Error{"VLErrorDomain", -8, "The keyring is locked."};
-    const Texts warning{
-        "Failed to store Login keychain unlock key. The keyring is locked.",
-        "User was successfully paired (public key hash: B1) but user password will be required "
-        "after next SmartCard login to unlock Login keychain."};
+    localization().translate("NO_WRAP_KEY_ERROR", "This card cannot do it.");
+    service.remove(blue);
+    service.insert({red, "Red Card", {{blueSigning, "Alice"}}, std::nullopt});
+    const Texts warning = warningWith("This card cannot do it.");
 
     const auto run = pair();
     EXPECT_EQ(run.status, 0);
@@ -74,13 +80,37 @@ TEST_F(PairCommand, PrintsAWarningAndStillSucceedsWhenTheUnlockKeyIsNotStored) {
     expectPrinted(verbose, warning);
 }
 
-TEST_F(PairCommand, PrintsNoReasonForAnUnlockKeyThatIsNotStoredWithoutAnErrorObject) {
-    fakes::unlockKey().status = -8;
+TEST_F(PairCommand, SaysThatAnUnlockKeyIsStoredAtTheConsoleOnly) {
+    localization().translate("STORE_UNLOCK_KEY_CURRENT_USER_ERROR", "Alice is not here.");
+    accounts().add("bob", 1001);
 
-    expectPrinted(pair(), {"Failed to store Login keychain unlock key. ",
-                           "User was successfully paired (public key hash: B1) but user password "
-                           "will be required after next SmartCard login to unlock Login "
-                           "keychain."});
+    const auto run = vlmbind({"-p", "-u", "bob", "-h", "B1"});
+
+    EXPECT_EQ(run.status, 0);
+    expectPrinted(run, warningWith("Alice is not here."));
+}
+
+TEST_F(PairCommand, SaysInWordsWhyTheKeychainDidNotStore) {
+    struct Case {
+        platform::Status status;
+        std::string words;
+    };
+    for (const auto& [status, words] :
+         {Case{-2004, "was pulled out"}, Case{-2007, "was not entered"},
+          Case{-2021, "There is no login keyring"}, Case{-2022, "does not open the login keyring"},
+          Case{-2023, "has no key that can protect"},
+          Case{-2013, "The operation could not be completed. (VLErrorDomain error -2013)"}}) {
+        keychain().failWith(status);
+        service.pairings.clear();
+
+        const auto run = pair();
+
+        EXPECT_EQ(run.status, 0);
+        EXPECT_NE(run.output.find("Failed to store Login keychain unlock key. "),
+                  std::string::npos);
+        EXPECT_NE(run.output.find(words), std::string::npos) << run.output;
+        EXPECT_EQ(service.pairings.size(), 1U) << "the pairing stands";
+    }
 }
 
 TEST_F(PairCommand, IsRefusedByTheOneCardRuleForAUserWhoIsPaired) {
@@ -125,7 +155,7 @@ TEST_F(PairCommand, SaysWhyThePairingFailed) {
 
     EXPECT_EQ(run.status, 255);
     expectPrinted(run, {"Cannot pair user (public key hash: B1). The PIN is wrong, 2 tries left."});
-    EXPECT_TRUE(fakes::unlockKey().asked.empty());
+    EXPECT_TRUE(keychain().asked.empty());
     EXPECT_FALSE(debugged("exiting"));
 }
 

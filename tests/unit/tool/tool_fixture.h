@@ -12,7 +12,6 @@
 #include "arguments.h"
 #include "fake_hints_service.h"
 #include "fake_settings.h"
-#include "fake_unlock_key.h"
 #include "platform_test.h"
 #include "tool/command_line.h"
 #include "tool/console.h"
@@ -41,7 +40,6 @@ protected:
     void SetUp() override {
         service.plugInto(ipc());
         fakes::settings() = {};
-        fakes::unlockKey() = {};
     }
 
     Run vlmbind(const Texts& options) {

@@ -9,7 +9,6 @@
 
 #include "fake_bind_dialog_window.h"
 #include "fake_hints_service.h"
-#include "fake_unlock_key.h"
 #include "platform_test.h"
 #include "ui/bind_dialog.h"
 
@@ -26,7 +25,8 @@ protected:
 
     void SetUp() override {
         fakes::describeBindDialog(windowing());
-        fakes::unlockKey() = {};
+        accounts().add("alice", 1000);
+        sessions().login(1000, /*onConsole=*/true);
         service.plugInto(ipc());
         operation->setReply([this](BindResult result, const std::optional<Error>& error) {
             replies.push_back(result);
@@ -42,6 +42,7 @@ protected:
     void offerBlueCard() {
         service.insert({blue, "Blue Card", {{{1}, "A"}, {{2}, "B"}}, Bytes{0xBB}});
         offer({{blue, {{{1}, "A"}, {{2}, "B"}}}});
+        operation->setWrapKeysHashMap(BindOperation::WrapKeysHashMap{{{0xBB}, blue}});
     }
 
     fakes::FakeScreenWindow& screen() { return *windowing().windows.back(); }

@@ -52,7 +52,8 @@ TEST_F(BindDialogPairing, ThatWorksFinishesWithTheHash) {
     EXPECT_TRUE(screen().sheets.empty());
     EXPECT_EQ(replies, std::vector{BindResult::Succeeded});
     EXPECT_EQ(repliedError, std::nullopt);
-    EXPECT_EQ(fakes::unlockKey().asked, (std::vector<BindOperation::OptionalHash>{Bytes{1}}));
+    ASSERT_EQ(keychain().stored.size(), 1U);
+    EXPECT_EQ(keychain().stored[0].hash, Bytes{1});
 }
 
 TEST_F(BindDialogPairing, RequiresAWrapKey) {
@@ -154,7 +155,7 @@ TEST_F(BindDialogPairing, ThatIsRefusedFailsWithTheErrorOfTheRefusal) {
                                   "-2004: The PIN was wrong."});
     EXPECT_EQ(replies, std::vector{BindResult::Failed});
     EXPECT_EQ(repliedError, why);
-    EXPECT_TRUE(fakes::unlockKey().asked.empty());
+    EXPECT_TRUE(keychain().asked.empty());
 }
 
 TEST_F(BindDialogPairing, ThatFailsWithoutAnErrorFailsWithoutOne) {
@@ -166,8 +167,7 @@ TEST_F(BindDialogPairing, ThatFailsWithoutAnErrorFailsWithoutOne) {
 }
 
 TEST_F(BindDialogPairing, WithoutAnUnlockKeySaysSoFirstAndFinishesThen) {
-    fakes::unlockKey().status = -8;
-    fakes::unlockKey().error = Error{"VLErrorDomain", -8, "dropped"};
+    keychain().failWith(-2022);
 
     pairToTheEnd();
 
@@ -189,7 +189,7 @@ TEST_F(BindDialogPairing, WithoutAnUnlockKeySaysSoFirstAndFinishesThen) {
 }
 
 TEST_F(BindDialogPairing, WithoutAnUnlockKeyFinishesAtOnceWhenTheWindowIsClosed) {
-    fakes::unlockKey().status = -8;
+    keychain().failWith(-2022);
     pair();
     dialog->close();
 
@@ -199,7 +199,7 @@ TEST_F(BindDialogPairing, WithoutAnUnlockKeyFinishesAtOnceWhenTheWindowIsClosed)
 }
 
 TEST_F(BindDialogPairing, AnAlertThatNobodyDismissesKeepsNothing) {
-    fakes::unlockKey().status = -8;
+    keychain().failWith(-2022);
     pairToTheEnd();
     const std::weak_ptr<BindDialog> gone = dialog;
 

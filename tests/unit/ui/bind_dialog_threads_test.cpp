@@ -46,7 +46,7 @@ TEST_F(BindDialogThreads, TheListIsRefreshedWhileTheWorkerPairs) {
 }
 
 TEST_F(BindDialogThreads, TheAlertComesWhileTheListIsRefreshed) {
-    fakes::unlockKey().status = -8;
+    keychain().failWith(-2022);
     screen().click("okButton");
 
     besideTheWorker([&] { dialog->refreshIdentities(); });

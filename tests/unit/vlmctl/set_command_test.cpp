@@ -55,6 +55,27 @@ TEST_F(SetCommand, RefusesWordsThatAreNoSwitch) {
     }
 }
 
+TEST_F(SetCommand, StoresAChoiceAsItsNumber) {
+    const std::pair<const char*, int> rows[] = {{"none", 0}, {"lock", 1}, {"logout", 2}, {"0", 0},
+                                                {"1", 1},    {"2", 2},    {"Lock", 1}};
+    for (const auto& [word, number] : rows) {
+        SCOPED_TRACE(word);
+
+        const auto run = vlmctl({"set", "tokenRemovalAction", word});
+
+        EXPECT_EQ(run.status, 0) << run.complaints;
+        EXPECT_EQ(onMachine("tokenRemovalAction"), PropertyList(number));
+    }
+}
+
+TEST_F(SetCommand, RefusesWordsThatAreNoChoice) {
+    for (const char* word : {"on", "off", "3", "1.0", "", "log out", "true"}) {
+        SCOPED_TRACE(word);
+        expectRefused(vlmctl({"set", "tokenRemovalAction", word}),
+                      "tokenRemovalAction is one of none, lock, logout");
+    }
+}
+
 TEST_F(SetCommand, RefusesAKeyThatNobodyReads) {
     expectRefused(vlmctl({"set", "userPairing", "on"}), "did you mean \"UserPairing\"?");
     expectRefused(vlmctl({"set", "AttributeMapping", "on"}), "there is no setting");

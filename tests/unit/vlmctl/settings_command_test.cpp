@@ -30,7 +30,8 @@ TEST_F(SettingsCommand, ListsEveryKnownKeyWithItsDefault) {
               "checkCertificateTrust  0      default\n"
               "useLocalOd             0      default\n"
               "enforceSmartCard       0      default\n"
-              "allowUnmappedUsers     0      default\n");
+              "allowUnmappedUsers     0      default\n"
+              "tokenRemovalAction     0      default\n");
     EXPECT_EQ(run.complaints, "");
 }
 

@@ -4,6 +4,7 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 
 namespace vlm::service {
@@ -88,22 +89,78 @@ TEST(FrameAssemblerTest, PutsPiecesTogetherByteByByte) {
     const Bytes stream = {2, 0, 0, 0, 8, 9, 0, 0, 0, 0, 1};
 
     for (std::size_t i = 0; i < 5; ++i)
-        ASSERT_EQ(assembler.add(std::span(stream).subspan(i, 1)),
-                  FrameAssembler::State::Incomplete);
-    ASSERT_EQ(assembler.add(std::span(stream).subspan(5)), FrameAssembler::State::Complete);
+        ASSERT_EQ(assembler.add(std::span(stream).subspan(i, 1)), FrameState::Incomplete);
+    ASSERT_EQ(assembler.add(std::span(stream).subspan(5)), FrameState::Complete);
 
     EXPECT_EQ(assembler.take(), (Bytes{8, 9}));
-    EXPECT_EQ(assembler.add({}), FrameAssembler::State::Complete);
+    EXPECT_EQ(assembler.add({}), FrameState::Complete);
     EXPECT_EQ(assembler.take(), Bytes{});
-    EXPECT_EQ(assembler.add({}), FrameAssembler::State::Incomplete);
+    EXPECT_EQ(assembler.add({}), FrameState::Incomplete);
 }
 
 TEST(FrameAssemblerTest, RefusesAFrameThatIsTooLongAtItsHeader) {
     FrameAssembler assembler;
 
-    EXPECT_EQ(assembler.add(Bytes{0, 0, 0, 1}), FrameAssembler::State::Incomplete);
-    EXPECT_EQ(FrameAssembler().add(Bytes{1, 0, 0, 1}), FrameAssembler::State::TooLong);
-    EXPECT_EQ(FrameAssembler().add(Bytes{255, 255, 255, 255}), FrameAssembler::State::TooLong);
+    EXPECT_EQ(assembler.add(Bytes{0, 0, 0, 1}), FrameState::Incomplete);
+    EXPECT_EQ(FrameAssembler().add(Bytes{1, 0, 0, 1}), FrameState::TooLong);
+    EXPECT_EQ(FrameAssembler().add(Bytes{255, 255, 255, 255}), FrameState::TooLong);
+}
+
+TEST(FrameAssemblerTest, TellsHowManyBytesItsFrameStillMisses) {
+    FrameAssembler assembler;
+
+    EXPECT_EQ(assembler.missing(), 4U);
+    assembler.add(Bytes{2, 0});
+    EXPECT_EQ(assembler.missing(), 2U);
+    assembler.add(Bytes{0, 0});
+    EXPECT_EQ(assembler.missing(), 2U);
+    assembler.add(Bytes{8});
+    EXPECT_EQ(assembler.missing(), 1U);
+    EXPECT_EQ(assembler.add(Bytes{9}), FrameState::Complete);
+    EXPECT_EQ(assembler.missing(), 0U);
+    assembler.take();
+    EXPECT_EQ(assembler.missing(), 4U);
+}
+
+// Puts as much of the stream where it belongs as there is room for, at most that many at once.
+FrameState fill(SecretAssembler& assembler, Bytes stream, std::size_t atOnce) {
+    auto state = FrameState::Incomplete;
+    while (!stream.empty() && state == FrameState::Incomplete) {
+        const auto room = assembler.room();
+        const std::size_t size = std::min({room.size(), stream.size(), atOnce});
+        std::copy_n(stream.begin(), size, room.begin());
+        stream.erase(stream.begin(), stream.begin() + static_cast<std::ptrdiff_t>(size));
+        state = assembler.filled(size);
+    }
+    return state;
+}
+
+TEST(SecretAssemblerTest, PutsPiecesTogether) {
+    for (const std::size_t atOnce : {1, 2, 3, 100}) {
+        SecretAssembler assembler(16);
+
+        EXPECT_EQ(fill(assembler, {3, 0, 0, 0, 'a', 'b', 'c'}, atOnce), FrameState::Complete);
+        EXPECT_EQ(assembler.take().text(), "abc");
+    }
+}
+
+TEST(SecretAssemblerTest, TakesAnEmptySecretAndNoHalfOne) {
+    SecretAssembler empty(16);
+    SecretAssembler half(16);
+
+    EXPECT_EQ(fill(empty, {0, 0, 0, 0}, 100), FrameState::Complete);
+    EXPECT_TRUE(empty.take().empty());
+    EXPECT_EQ(fill(half, {2, 0, 0, 0, 'a'}, 100), FrameState::Incomplete);
+}
+
+TEST(SecretAssemblerTest, RefusesAFrameThatIsTooLongAtItsHeader) {
+    SecretAssembler most(16);
+    SecretAssembler more(16);
+    SecretAssembler absurd(16);
+
+    EXPECT_EQ(fill(most, {16, 0, 0, 0}, 100), FrameState::Incomplete);
+    EXPECT_EQ(fill(more, {17, 0, 0, 0}, 100), FrameState::TooLong);
+    EXPECT_EQ(fill(absurd, {255, 255, 255, 255}, 100), FrameState::TooLong);
 }
 
 }  // namespace

@@ -22,6 +22,7 @@ CertificateObject certificate(const std::string& name, std::uint8_t keyNumber,
     object.facts.notBefore = kNow - 100;
     object.facts.notAfter = kNow + 100;
     object.facts.maySign = object.facts.mayWrap = true;
+    object.der = {keyNumber, 99};
     return object;
 }
 
@@ -44,6 +45,8 @@ KeyObject keyOf(const CertificateObject& certificate, bool isPrivate = false) {
 
 class AddIdentitiesTest : public testing::Test {
 protected:
+    AddIdentitiesTest() { objects.wrapMechanisms = {.oaep = true, .pkcs1 = true, .ecdh = true}; }
+
     void show(const CertificateObject& certificate) { objects.certificates.push_back(certificate); }
     void show(const KeyObject& key) {
         objects.keys.push_back(key);
@@ -74,6 +77,16 @@ TEST_F(AddIdentitiesTest, SortsByHashWhateverTheModulesOrder) {
         showWithKey(certificate(std::to_string(number), number));
 
     EXPECT_THAT(names(), ElementsAre("1", "2", "3"));
+}
+
+TEST_F(AddIdentitiesTest, TellsTheCertificatesWithAndWithoutAKey) {
+    showWithKey(certificate("with", 1));
+    show(certificate("without", 2));
+
+    const auto token = made();
+
+    EXPECT_EQ(token.identities.at(0).certificate, (Bytes{1, 99}));
+    EXPECT_THAT(token.otherCertificates, ElementsAre(Bytes{2, 99}));
 }
 
 TEST_F(AddIdentitiesTest, NeedsAWitnessWhereTheTokenShowsKeys) {
@@ -208,6 +221,34 @@ TEST_F(AddIdentitiesTest, WrapsByTheSmallestRsaKeyElseTheSmallestEcKey) {
     showWithKey(certificate("rsa", 4, KeyKind::Rsa));
     showWithKey(certificate("smaller rsa", 3, KeyKind::Rsa));
     EXPECT_EQ(made().wrapKeyHash, Bytes(32, 3));
+}
+
+TEST_F(AddIdentitiesTest, WrapsInTheBestWayThatTheTokenOffers) {
+    struct Case {
+        const char* why;
+        WrapMechanisms mechanisms;
+        std::optional<std::uint8_t> key;
+        WrapScheme scheme;
+    };
+    const std::vector<Case> cases = {
+        {"everything", {true, true, true}, 2, WrapScheme::RsaOaepSha256},
+        {"no ECDH", {true, true, false}, 2, WrapScheme::RsaOaepSha256},
+        {"the old padding is the last choice", {false, true, true}, 1, WrapScheme::Ecdh},
+        {"and the only one", {false, true, false}, 2, WrapScheme::RsaPkcs1},
+        {"ECDH only", {false, false, true}, 1, WrapScheme::Ecdh},
+        {"nothing", {false, false, false}, std::nullopt, WrapScheme::RsaOaepSha256},
+    };
+    showWithKey(certificate("ec", 1));
+    showWithKey(certificate("rsa", 2, KeyKind::Rsa));
+    for (const Case& each : cases) {
+        objects.wrapMechanisms = each.mechanisms;
+
+        const Token token = made();
+
+        const auto expected = each.key ? std::optional(Bytes(32, *each.key)) : std::nullopt;
+        EXPECT_EQ(token.wrapKeyHash, expected) << each.why;
+        EXPECT_EQ(token.wrapScheme, each.scheme) << each.why;
+    }
 }
 
 TEST_F(AddIdentitiesTest, WrapsByNoKeyThatOrWhoseCertificateDoesNotAllowIt) {

@@ -35,13 +35,13 @@ protected:
     fs::path library(const std::string& name) { return fs::canonical(_folder / "lib" / name); }
 
     // The names of the modules, in order.
-    std::vector<std::string> names() {
+    std::vector<std::string> names(ModuleKind kind = ModuleKind::Card) {
         std::vector<std::string> names;
-        for (const auto& module : configured()) names.push_back(module.name);
+        for (const auto& module : configured(kind)) names.push_back(module.name);
         return names;
     }
-    std::vector<ConfiguredModule> configured() {
-        return configuredModules({_folder / "package", _folder / "admin", _folder / "lib"});
+    std::vector<ConfiguredModule> configured(ModuleKind kind = ModuleKind::Card) {
+        return configuredModules({_folder / "package", _folder / "admin", _folder / "lib"}, kind);
     }
     std::vector<std::string> warnings() { return log().texts(platform::LogLevel::Error); }
 
@@ -120,6 +120,15 @@ TEST_F(ModuleRegistryTest, TakesWhatIsMeantForThisProgramAndHoldsCards) {
         EXPECT_EQ(names().size(), each.taken ? 1U : 0U) << each.why;
     }
     EXPECT_THAT(warnings(), IsEmpty());
+}
+
+TEST_F(ModuleRegistryTest, TellsTheModulesThatHoldTrustAnchorsApart) {
+    package("cards.module", "module: a.so\n");
+    package("anchors.module", "module: b.so\ntrust-policy: yes\n");
+    package("elsewhere.module", "module: c.so\ntrust-policy: yes\ndisable-in: vlmhintsd\n");
+
+    EXPECT_THAT(names(), ElementsAre("cards"));
+    EXPECT_THAT(names(ModuleKind::Trust), ElementsAre("anchors"));
 }
 
 TEST_F(ModuleRegistryTest, LeavesOutFilesOfOtherNames) {

@@ -11,16 +11,15 @@ namespace {
 const Bytes kChallenge(32, 0x11);
 
 // Made once: it takes its time.
-const PublicKeyHandle& rsaKey() {
-    static const PublicKeyHandle kKey(
-        EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", std::size_t{2048}));
+const KeyHandle& rsaKey() {
+    static const KeyHandle kKey(EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", std::size_t{2048}));
     return kKey;
 }
-PublicKeyHandle makeEc(const char* curve) {
-    return PublicKeyHandle(EVP_PKEY_Q_keygen(nullptr, nullptr, "EC", curve));
+KeyHandle makeEc(const char* curve) {
+    return KeyHandle(EVP_PKEY_Q_keygen(nullptr, nullptr, "EC", curve));
 }
 
-Bytes publicKeyInfoOf(const PublicKeyHandle& key) {
+Bytes publicKeyInfoOf(const KeyHandle& key) {
     unsigned char* der = nullptr;
     const int size = i2d_PUBKEY(key.get(), &der);
     Bytes info(der, der + size);
@@ -28,7 +27,7 @@ Bytes publicKeyInfoOf(const PublicKeyHandle& key) {
     return info;
 }
 
-Bytes sign(const PublicKeyHandle& key, const EVP_MD* digest = EVP_sha256()) {
+Bytes sign(const KeyHandle& key, const EVP_MD* digest = EVP_sha256()) {
     const DigestContext context(EVP_MD_CTX_new());
     std::size_t size = 0;
     EVP_DigestSignInit(context.get(), nullptr, digest, nullptr, key.get());
@@ -41,7 +40,7 @@ Bytes sign(const PublicKeyHandle& key, const EVP_MD* digest = EVP_sha256()) {
 
 // A key with a good signature, of which one thing at a time is spoilt.
 struct Sample {
-    explicit Sample(const PublicKeyHandle& key)
+    explicit Sample(const KeyHandle& key)
         : info(publicKeyInfoOf(key)), hash(sha256(info)), signature(sign(key)) {}
     bool verifies() const { return verifySignature(info, hash, challenge, signature); }
 
@@ -90,12 +89,12 @@ TEST_F(VerifySignatureTest, RefusesAnotherKeyThanTheOneAskedFor) {
 }
 
 TEST_F(VerifySignatureTest, RefusesAnRsaKeyThatIsTooSmall) {
-    const PublicKeyHandle small(EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", std::size_t{1024}));
+    const KeyHandle small(EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", std::size_t{1024}));
     EXPECT_FALSE(Sample(small).verifies());
 }
 
 TEST_F(VerifySignatureTest, RefusesAnotherDigest) {
-    const PublicKeyHandle& key = rsaKey();
+    const KeyHandle& key = rsaKey();
     Sample sample(key);
     sample.signature = sign(key, EVP_sha1());
 
@@ -120,7 +119,7 @@ TEST_F(VerifySignatureTest, RefusesAKeyWithSomethingBehindIt) {
 }
 
 TEST_F(VerifySignatureTest, RefusesKeysOfOtherKinds) {
-    const PublicKeyHandle key(EVP_PKEY_Q_keygen(nullptr, nullptr, "ED25519"));
+    const KeyHandle key(EVP_PKEY_Q_keygen(nullptr, nullptr, "ED25519"));
     Sample sample(makeEc("P-256"));
     sample.info = publicKeyInfoOf(key);
     sample.hash = sha256(sample.info);

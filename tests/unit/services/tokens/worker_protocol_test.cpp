@@ -22,6 +22,7 @@ Identity sampleIdentity(std::uint8_t number) {
     identity.notBefore = -1;
     identity.notAfter = std::int64_t{1} << 40;
     identity.canSign = true;
+    identity.certificate = Bytes(300, number);
     return identity;
 }
 
@@ -35,15 +36,23 @@ Token sampleToken() {
     if (token.identities[1].publicKeyHash < token.identities[0].publicKeyHash)
         std::swap(token.identities[0], token.identities[1]);
     token.wrapKeyHash = token.identities[0].publicKeyHash;
+    token.otherCertificates = {Bytes(200, 7), Bytes(100, 8)};
+    token.wrapScheme = WrapScheme::RsaPkcs1;
     return token;
 }
 
-template <typename Answer>
-std::optional<Answer> roundTrip(const Answer& answer) {
+struct HostileCase {
+    const char* why;
+    const char* key;
+    PropertyList value;
+};
+
+template <typename Message>
+std::optional<Message> roundTrip(const Message& answer) {
     const auto message = encodeAnswer(answer);
     if (!message) return {};
     auto decoded = decodeAnswer(*message);
-    auto* same = decoded ? std::get_if<Answer>(&*decoded) : nullptr;
+    auto* same = decoded ? std::get_if<Message>(&*decoded) : nullptr;
     if (same == nullptr) return {};
     return std::move(*same);
 }
@@ -52,6 +61,7 @@ TEST(WorkerProtocolTest, CarriesTokens) {
     Token poor = sampleToken();
     poor.identities.clear();
     poor.wrapKeyHash.reset();
+    poor.wrapScheme = Token().wrapScheme;
     const std::vector<Token> tokens = {sampleToken(), poor};
 
     const auto answer = roundTrip(ListAnswer{tokens, {"one problem"}, true});
@@ -60,6 +70,34 @@ TEST(WorkerProtocolTest, CarriesTokens) {
     EXPECT_EQ(answer->tokens, tokens);
     EXPECT_EQ(answer->problems, std::vector<std::string>{"one problem"});
     EXPECT_TRUE(answer->announcesNothing);
+}
+
+TEST(WorkerProtocolTest, LeavesOutCertificatesThatAreOutOfBounds) {
+    Token token = sampleToken();
+    token.identities[0].certificate.resize(kMostCertificateBytes + 1);
+    token.otherCertificates = {Bytes(kMostCertificateBytes + 1)};
+    token.otherCertificates.resize(kMostOtherCertificates + 2, Bytes{1});
+
+    const auto answer = roundTrip(ListAnswer{std::vector{token}, {}});
+
+    ASSERT_TRUE(answer && answer->tokens);
+    const Token& told = answer->tokens->at(0);
+    EXPECT_EQ(told.identities[0].certificate, Bytes{});
+    EXPECT_EQ(told.identities[1].certificate, token.identities[1].certificate);
+    EXPECT_EQ(told.otherCertificates, std::vector<Bytes>(kMostOtherCertificates, Bytes{1}));
+}
+
+TEST(WorkerProtocolTest, TellsTokensWithoutCertificatesWhereThereIsNoRoomForThem) {
+    Token token = sampleToken();
+    token.otherCertificates.assign(kMostOtherCertificates, Bytes(kMostCertificateBytes));
+    std::vector<Token> tokens(40, token);
+
+    const auto answer = roundTrip(ListAnswer{tokens, {}});
+
+    ASSERT_TRUE(answer && answer->tokens);
+    EXPECT_EQ(answer->tokens->size(), 40U);
+    EXPECT_EQ(answer->tokens->at(0).identities[0].certificate, Bytes{});
+    EXPECT_EQ(answer->tokens->at(0).otherCertificates, std::vector<Bytes>{});
 }
 
 TEST(WorkerProtocolTest, TellsNoTokensFromUnchangedOnes) {
@@ -108,7 +146,65 @@ TEST(WorkerProtocolTest, CarriesRequestsWithoutThePin) {
     EXPECT_TRUE(std::holds_alternative<ListRequest>(*decodeRequest(*encodeListRequest())));
 }
 
+TEST(WorkerProtocolTest, CarriesWhatIsToBeOpened) {
+    for (const WrapScheme scheme :
+         {WrapScheme::RsaOaepSha256, WrapScheme::RsaPkcs1, WrapScheme::Ecdh}) {
+        ProofRequest request = sampleRequest();
+        request.open = OpenRequest{Bytes(32, 3), scheme, Bytes(kMostSealedBytes, 4)};
+
+        const auto decoded = decodeRequest(*encodeProofRequest(request));
+
+        ASSERT_TRUE(decoded);
+        EXPECT_EQ(std::get<ProofRequest>(*decoded).open, request.open);
+    }
+    EXPECT_FALSE(std::get<ProofRequest>(*decodeRequest(*encodeProofRequest(sampleRequest()))).open);
+}
+
+TEST(WorkerProtocolTest, CarriesWhyNothingWasOpened) {
+    for (const std::string why : {"", "because"}) {
+        const auto answer = roundTrip(OpeningAnswer{why});
+        ASSERT_TRUE(answer);
+        EXPECT_EQ(answer->whyNot, why);
+    }
+}
+
+TEST(WorkerProtocolTest, NeverHasASecretInAMessage) {
+    Proof proof;
+    proof.outcome = Proof::Outcome::Signed;
+    proof.opened = std::make_shared<const Secret>(Secret("top secret"));
+
+    const auto message = encodeAnswer(proof);
+
+    ASSERT_TRUE(message);
+    EXPECT_EQ(std::string(message->begin(), message->end()).find("secret"), std::string::npos);
+}
+
+TEST(WorkerProtocolTest, RefusesOpeningsThatAreOutOfBounds) {
+    const Dictionary good = {{"op", "prove"},      {"token", "pkcs11:token=a"},
+                             {"hash", Bytes(32)},  {"challenge", Bytes(32)},
+                             {"wrap", Bytes(32)},  {"scheme", 3},
+                             {"sealed", Bytes(65)}};
+    const std::vector<HostileCase> cases = {
+        {"wrap key of another size", "wrap", Bytes(31)},
+        {"scheme before the first", "scheme", 0},
+        {"scheme beyond the last", "scheme", 4},
+        {"scheme of a wrong type", "scheme", "ecdh"},
+        {"sealed part that is too long", "sealed", Bytes(kMostSealedBytes + 1)},
+        {"sealed part of a wrong type", "sealed", 1},
+    };
+    EXPECT_TRUE(decodeRequest(*platform::writeBinaryPropertyList(good)));
+    for (const HostileCase& each : cases) {
+        Dictionary request = good;
+        request.set(each.key, each.value);
+        EXPECT_FALSE(decodeRequest(*platform::writeBinaryPropertyList(request))) << each.why;
+    }
+}
+
 TEST(WorkerProtocolTest, RefusesToSendRequestsThatAreOutOfBounds) {
+    ProofRequest shortWrapKey = sampleRequest();
+    shortWrapKey.open = OpenRequest{Bytes(31), WrapScheme::Ecdh, Bytes(65)};
+    ProofRequest longSealed = sampleRequest();
+    longSealed.open = OpenRequest{Bytes(32), WrapScheme::Ecdh, Bytes(kMostSealedBytes + 1)};
     ProofRequest longPin = sampleRequest();
     longPin.pin = Secret(std::string(kMostPinBytes + 1, '1'));
     ProofRequest shortHash = sampleRequest();
@@ -119,6 +215,8 @@ TEST(WorkerProtocolTest, RefusesToSendRequestsThatAreOutOfBounds) {
     EXPECT_FALSE(encodeProofRequest(longPin));
     EXPECT_FALSE(encodeProofRequest(shortHash));
     EXPECT_FALSE(encodeProofRequest(longChallenge));
+    EXPECT_FALSE(encodeProofRequest(shortWrapKey));
+    EXPECT_FALSE(encodeProofRequest(longSealed));
 }
 
 // What a corrupted worker may say.
@@ -145,12 +243,6 @@ TEST(WorkerProtocolTest, TakesTheSampleThatTheHostileOnesAreMadeFrom) {
     EXPECT_TRUE(decodeTokens({tokenEntries()}));
 }
 
-struct HostileCase {
-    const char* why;
-    const char* key;
-    PropertyList value;
-};
-
 TEST(WorkerProtocolTest, RefusesTokensThatAreOutOfBounds) {
     const std::vector<HostileCase> cases = {
         {"identifier of a wrong type", "id", 5},
@@ -164,9 +256,13 @@ TEST(WorkerProtocolTest, RefusesTokensThatAreOutOfBounds) {
         {"PIN state below the first", "pin", -1},
         {"PIN state beyond the last", "pin", 4},
         {"wrap key of another size", "wrap", Bytes(31)},
+        {"wrap key without a scheme", "wrap", Bytes(32)},
         {"identities of a wrong type", "identities", Dictionary{}},
         {"too many identities", "identities", Array(4097, identityEntries())},
         {"identity that is none", "identities", Array{5}},
+        {"too many certificates", "others", Array(33, Bytes{1})},
+        {"certificate that is too long", "others", Array{Bytes((16 << 10) + 1)}},
+        {"certificate of a wrong type", "others", Array{"text"}},
     };
     for (const HostileCase& each : cases) {
         Dictionary token = tokenEntries();
@@ -185,6 +281,8 @@ TEST(WorkerProtocolTest, RefusesIdentitiesThatAreOutOfBounds) {
         {"date of a wrong type", "from", "now"},
         {"date out of range", "until", ~std::uint64_t{0}},
         {"ability of a wrong type", "signs", "yes"},
+        {"certificate that is too long", "certificate", Bytes((16 << 10) + 1)},
+        {"certificate of a wrong type", "certificate", "text"},
     };
     for (const HostileCase& each : cases) {
         Dictionary identity = identityEntries();
@@ -239,6 +337,7 @@ TEST(WorkerProtocolTest, RefusesWhatIsNoMessage) {
                                              Dictionary{{"problems", Array{5}}, {"silent", false}},
                                              Dictionary{{"problems", Array{}}},
                                              Dictionary{{"problems", Array{}}, {"silent", 1}},
+                                             Dictionary{{"unopened", 5}},
                                              Dictionary{{"failed", 5}}};
     for (const PropertyList& each : cases) {
         const auto message = platform::writeBinaryPropertyList(each);
