@@ -1,0 +1,64 @@
+#include "platform/text.h"
+#include "services/vlmctl/doctor/checks.h"
+#include "services/vlmctl/shown.h"
+
+namespace vlm::control::doctor {
+
+namespace {
+
+using platform::text;
+
+Finding checkPcscd(const Patient& patient) {
+    const auto program = patient.files.firstOf({"/usr/sbin/pcscd", "/usr/local/sbin/pcscd"});
+    const bool hasSocket = patient.files.has("/run/pcscd/pcscd.comm");
+    if (!program && !hasSocket)
+        return problem("pcscd", "the service that reads smart cards is not installed",
+                       "Install pcscd.");
+    if (!patient.answers) return ok("pcscd", "it is installed");
+    if (patient.answers->readers) return ok("pcscd", "it answers");
+    if (!hasSocket)
+        return problem("pcscd", "it is not running",
+                       "Start it: \"systemctl enable --now pcscd.socket\".");
+    return problem("pcscd", "it does not serve this user, or hangs",
+                   "\"journalctl -u pcscd\" says why; where polkit rules over cards, this user's "
+                   "session needs the right.");
+}
+
+Finding checkReader(const std::vector<std::string>& readers) {
+    if (readers.empty())
+        return warning("readers", "no reader is connected",
+                       "Connect one; if there is one, install its driver (libccid, as a rule).");
+    std::string names;
+    for (const auto& name : readers) names += (names.empty() ? "" : ", ") + shown(name);
+    return ok("readers", names);
+}
+
+Findings checkCards(const std::vector<Card>& cards) {
+    if (cards.empty())
+        return {warning("card", "no card is seen",
+                        "Insert one; if there is one, no card module knows it: see \"journalctl "
+                        "SUBSYSTEM=org.vlm.token\".")};
+    Findings findings;
+    for (const auto& card : cards) {
+        findings.push_back(ok("card", shown(card.name)));
+        for (const auto& name : card.unusable)
+            findings.push_back(warning(
+                "certificate", text("\"{}\" is out of its dates, or may not sign", shown(name)),
+                "Check the clock; or have the card renewed."));
+    }
+    return findings;
+}
+
+}  // namespace
+
+Findings checkReaders(const Patient& patient) {
+    Findings findings{checkPcscd(patient)};
+    if (!patient.answers) return findings;
+    if (patient.answers->readers) findings.push_back(checkReader(*patient.answers->readers));
+    if (patient.answers->cards)
+        for (auto& finding : checkCards(*patient.answers->cards))
+            findings.push_back(std::move(finding));
+    return findings;
+}
+
+}  // namespace vlm::control::doctor
