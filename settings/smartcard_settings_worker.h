@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <filesystem>
 #include <optional>
+#include <string_view>
 
 #include "platform/property_list.h"
 #include "platform/string.h"
@@ -21,6 +22,9 @@ struct ResolvedSetting {
 };
 
 ResolvedSetting resolveSetting(const platform::String& key);
+
+// Likewise, without a line in the log: for who asks again and again.
+std::int32_t settingNow(std::string_view key);
 
 // VLGetSmartcardSettingForUser() with the configuration file at this path.
 std::int32_t settingForUser(const platform::String& key,

@@ -41,7 +41,7 @@ std::int64_t secondsNow() {
     return std::chrono::duration_cast<std::chrono::seconds>(since).count();
 }
 
-bool isTrustChecked() { return resolveSetting("checkCertificateTrust").value != 0; }
+bool isTrustChecked() { return settingNow("checkCertificateTrust") != 0; }
 
 std::int64_t milliseconds() {
     const auto since = std::chrono::steady_clock::now().time_since_epoch();

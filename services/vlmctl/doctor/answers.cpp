@@ -44,16 +44,15 @@ std::optional<std::vector<std::string>> askForReaders() {
     return pcscd.readers();
 }
 
-std::vector<std::string> unusableOn(const TokenInfo& info, const std::string& token) {
-    std::vector<std::string> unusable;
+Card cardOf(const TokenInfo& info, const std::string& token, const std::string& name) {
+    Card card{name, 0, 0};
     const auto hashes = info.hashesByToken.find(token);
-    if (hashes == info.hashesByToken.end()) return unusable;
+    if (hashes == info.hashesByToken.end()) return card;
     for (const auto& hash : hashes->second) {
-        const auto name = info.names.find(hash);
-        if (!info.offered.contains(hash) && !info.bound.contains(hash))
-            unusable.push_back(name == info.names.end() ? "without a name" : name->second);
+        ++card.identities;
+        if (info.offered.contains(hash) || info.bound.contains(hash)) ++card.usable;
     }
-    return unusable;
+    return card;
 }
 
 std::optional<std::vector<Card>> askForCards() {
@@ -61,8 +60,7 @@ std::optional<std::vector<Card>> askForCards() {
     if (!record) return std::nullopt;
     const TokenInfo info(*record);
     std::vector<Card> cards;
-    for (const auto& [token, name] : info.cardNames)
-        cards.push_back({name, unusableOn(info, token)});
+    for (const auto& [token, name] : info.cardNames) cards.push_back(cardOf(info, token, name));
     return cards;
 }
 

@@ -17,7 +17,8 @@ namespace vlm::control::doctor {
 
 struct Card {
     std::string name;
-    std::vector<std::string> unusable;  // identities that no login would accept
+    std::size_t identities = 0;
+    std::size_t usable = 0;  // of these: paired, or fit for it
 };
 
 struct Answers {

@@ -33,6 +33,16 @@ Finding checkReader(const std::vector<std::string>& readers) {
     return ok("readers", names);
 }
 
+// A card holds certificates for other purposes, too; one that is good for a login is enough.
+Finding checkCertificates(const Card& card) {
+    if (card.identities == 0)
+        return warning("certificate", text("\"{}\" holds none with a key", shown(card.name)),
+                       "Have one put on it by who issues the cards.");
+    return warning("certificate",
+                   text("none on \"{}\" is in its dates and may sign", shown(card.name)),
+                   "Check the clock; or have the card renewed.");
+}
+
 Findings checkCards(const std::vector<Card>& cards) {
     if (cards.empty())
         return {warning("card", "no card is seen",
@@ -41,10 +51,7 @@ Findings checkCards(const std::vector<Card>& cards) {
     Findings findings;
     for (const auto& card : cards) {
         findings.push_back(ok("card", shown(card.name)));
-        for (const auto& name : card.unusable)
-            findings.push_back(warning(
-                "certificate", text("\"{}\" is out of its dates, or may not sign", shown(name)),
-                "Check the clock; or have the card renewed."));
+        if (card.usable == 0) findings.push_back(checkCertificates(card));
     }
     return findings;
 }

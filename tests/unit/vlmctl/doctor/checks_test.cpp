@@ -45,10 +45,12 @@ TEST_F(DoctorChecks, FindMissingReadersAndCards) {
     EXPECT_THAT(aboutReaders("card"), Warns("no card"));
 }
 
-TEST_F(DoctorChecks, FindACertificateThatNoLoginAccepts) {
-    patient.answers->cards->at(0).unusable = {"Ali\nce"};
+TEST_F(DoctorChecks, FindACardThatIsGoodForNoLogin) {
+    patient.answers->cards = {{Card{"A\nB", 2, 0}}};
+    EXPECT_THAT(aboutReaders("certificate"), Warns("none on \"A\ufffdB\" is in its dates"));
 
-    EXPECT_THAT(aboutReaders("certificate"), Warns("\"Ali\ufffdce\" is out of its dates"));
+    patient.answers->cards = {{Card{"Empty", 0, 0}}};
+    EXPECT_THAT(aboutReaders("certificate"), Warns("\"Empty\" holds none"));
 }
 
 TEST_F(DoctorChecks, FindADaemonThatDoesNotAnswer) {

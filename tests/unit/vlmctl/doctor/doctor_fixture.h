@@ -18,7 +18,7 @@ class DoctorTest : public ControlTest {
 protected:
     DoctorTest() {
         patient.files = MachineFiles(folder.path());
-        patient.answers = Answers{{{"Reader"}}, {{Card{"PIV", {}}}}, std::size_t{1}};
+        patient.answers = Answers{{{"Reader"}}, {{Card{"PIV", 2, 1}}}, std::size_t{1}};
         patient.account = "alice";
         patient.now = std::int64_t{1} << 40U;
     }
