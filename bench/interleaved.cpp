@@ -20,9 +20,10 @@ Seconds now(Clock clock) {
 
 }  // namespace
 
-std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t turns, Clock clock) {
+std::vector<std::vector<Seconds>> turns(const std::vector<Work>& pieces, std::size_t count,
+                                        Clock clock) {
     std::vector<std::vector<Seconds>> times(pieces.size());
-    for (std::size_t turn = 0; turn < turns + 1; ++turn) {
+    for (std::size_t turn = 0; turn < count + 1; ++turn) {
         for (std::size_t i = 0; i < pieces.size(); ++i) {
             const Seconds start = now(clock);
             for (std::size_t n = 0; n < pieces[i].times; ++n) pieces[i].run();
@@ -31,8 +32,13 @@ std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t tu
             if (!warmsUp) times[i].push_back(time / static_cast<double>(pieces[i].times));
         }
     }
+    return times;
+}
+
+std::vector<Seconds> medianTimes(const std::vector<Work>& pieces, std::size_t turns, Clock clock) {
     std::vector<Seconds> medians;
-    for (auto& each : times) medians.push_back(quantile(std::move(each), 0.5));
+    for (auto& each : bench::turns(pieces, turns, clock))
+        medians.push_back(quantile(std::move(each), 0.5));
     return medians;
 }
 

@@ -22,6 +22,10 @@ struct Work {
 // thread does itself.
 enum class Clock { Processor, Wall };
 
+// The times of one run of each piece, one for each of that many turns.
+std::vector<std::vector<std::chrono::duration<double>>> turns(const std::vector<Work>& pieces,
+                                                              std::size_t count, Clock clock);
+
 // The median time of one run of each piece, after that many turns.
 std::vector<std::chrono::duration<double>> medianTimes(const std::vector<Work>& pieces,
                                                        std::size_t turns,

@@ -39,6 +39,16 @@ std::optional<PropertyList> storedValue(const std::string& key, bool forced) {
     return preferences.value(key, kSmartcardDomain, PreferencesUser::Any);
 }
 
+bool isForced(const KnownSetting& rule) {
+    return rule.obeysManagement &&
+           platform::current().preferences().isForced(rule.key, kSmartcardDomain);
+}
+
+std::optional<std::int32_t> storedNumber(const std::string& key, bool forced) {
+    const auto stored = storedValue(key, forced);
+    return stored ? settingNumber(*stored) : std::nullopt;
+}
+
 }  // namespace
 
 std::optional<std::int32_t> settingNumber(const PropertyList& value) {
@@ -52,17 +62,20 @@ std::optional<std::int32_t> settingNumber(const PropertyList& value) {
 ResolvedSetting resolveSetting(const String& givenKey) {
     const std::string key = givenKey.utf8();
     const KnownSetting rule = ruleOf(key);
-    const bool forced =
-        rule.obeysManagement && platform::current().preferences().isForced(key, kSmartcardDomain);
+    const bool forced = isForced(rule);
     log().info(forced ? "Using MDM prefs" : "Using system prefs");
 
-    const auto stored = storedValue(key, forced);
-    if (const auto number = stored ? settingNumber(*stored) : std::nullopt)
+    if (const auto number = storedNumber(key, forced))
         return {*number,
                 forced ? SmartcardSettingOrigin::Managed : SmartcardSettingOrigin::Machine};
 
     log().info("Using default value");
     return {rule.defaultValue, SmartcardSettingOrigin::Default};
+}
+
+std::int32_t settingNow(std::string_view key) {
+    const KnownSetting rule = ruleOf(key);
+    return storedNumber(std::string(key), isForced(rule)).value_or(rule.defaultValue);
 }
 
 }  // namespace vlm

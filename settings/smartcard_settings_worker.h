@@ -6,6 +6,7 @@
 #include <filesystem>
 #include <functional>
 #include <optional>
+#include <string_view>
 
 #include "platform/property_list.h"
 #include "platform/string.h"
@@ -22,6 +23,9 @@ struct ResolvedSetting {
 };
 
 ResolvedSetting resolveSetting(const platform::String& key);
+
+// Likewise, without a line in the log: for who asks again and again.
+std::int32_t settingNow(std::string_view key);
 
 // Whether the user is paired with a card, as far as who asks can tell.
 using IsUserBound = std::function<bool(const std::optional<platform::String>& userName)>;

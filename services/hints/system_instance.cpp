@@ -43,7 +43,7 @@ std::int64_t secondsNow() {
     return std::chrono::duration_cast<std::chrono::seconds>(since).count();
 }
 
-bool isTrustChecked() { return resolveSetting("checkCertificateTrust").value != 0; }
+bool isTrustChecked() { return settingNow("checkCertificateTrust") != 0; }
 
 bool isSession(const std::string& name) {
     uid_t user = 0;

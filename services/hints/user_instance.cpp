@@ -54,7 +54,7 @@ private:
     PrompterRegistration _registration;
 };
 
-std::int32_t removalSetting() { return resolveSetting("tokenRemovalAction").value; }
+std::int32_t removalSetting() { return settingNow("tokenRemovalAction"); }
 
 }  // namespace
 

@@ -50,8 +50,8 @@ private:
     static int onAlias(sd_bus_message* reply, void* self, sd_bus_error*) {
         auto& search = *static_cast<Search*>(self);
         const auto path = textIn(reply, 'o');
-        search._path = path.empty() || path == "/" ? kUsualPath : path;
-        if (!search.askWhetherItIsThere()) search.end({});
+        search._path = path == "/" ? kUsualPath : path;
+        if (path.empty() || !search.askWhetherItIsThere()) search.end({});
         return 1;
     }
 

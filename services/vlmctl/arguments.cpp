@@ -27,16 +27,20 @@ Cards:
   tokens               list the identities of the inserted cards
   pairings             list the paired identities: one's own, or for root all
 
+Help:
+  doctor               tell what keeps cards from working, and what to do
+
 Options:
   -u, --user NAME      settings, get: what holds for this user, and why
                        pairings: those of this account
       --database FILE  pairings: read this database
+      --root FOLDER    doctor: look at the files of a machine in this folder
       --json           print JSON
       --no-legend      print tables without headings
   -h, --help           print this and end
       --version        print the version and end
 
-Exit status: 0 success; 1 failure, or the checked file has problems; 2 wrong
+Exit status: 0 success; 1 failure, or what was checked has problems; 2 wrong
 usage, or the file to check cannot be read.
 )";
 
@@ -56,6 +60,7 @@ constexpr std::array kCommands = {
     CommandRule{"check", Command::Check, "FILE", 1},
     CommandRule{"tokens", Command::Tokens, "nothing", 0},
     CommandRule{"pairings", Command::Pairings, "nothing", 0, true},
+    CommandRule{"doctor", Command::Doctor, "nothing", 0},
 };
 
 struct FlagOption {
@@ -78,6 +83,7 @@ struct ValueOption {
 constexpr std::array kValueOptions = {
     ValueOption{"--user", "-u", &Arguments::user},
     ValueOption{"--database", "", &Arguments::database},
+    ValueOption{"--root", "", &Arguments::root},
 };
 
 class Parser {
@@ -144,6 +150,8 @@ private:
             return refuse(platform::text("{} takes no --user", rule->name));
         if (_arguments.database && rule->command != Command::Pairings)
             return refuse(platform::text("{} takes no --database", rule->name));
+        if (_arguments.root && rule->command != Command::Doctor)
+            return refuse(platform::text("{} takes no --root", rule->name));
         _arguments.command = rule->command;
         _arguments.operands = std::move(_operands);
     }

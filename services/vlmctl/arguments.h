@@ -10,13 +10,14 @@
 
 namespace vlm::control {
 
-enum class Command { Settings, Get, Set, Unset, Check, Tokens, Pairings };
+enum class Command { Settings, Get, Set, Unset, Check, Tokens, Pairings, Doctor };
 
 struct Arguments {
     Command command = Command::Settings;
     std::vector<std::string> operands;    // as many as the command wants
     std::optional<std::string> user;      // whom it is about
     std::optional<std::string> database;  // the file to read the pairings from
+    std::optional<std::string> root;      // the folder whose files are looked at
     bool json = false;
     bool legend = true;  // headings above tables
 };

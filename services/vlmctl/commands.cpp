@@ -22,6 +22,8 @@ int runCommand(const Arguments& arguments, Output& output) {
             return listTokens(arguments, output);
         case Command::Pairings:
             return listPairings(arguments, output);
+        case Command::Doctor:
+            return examine(arguments, output);
     }
     return kExitUsage;
 }

@@ -2,7 +2,9 @@
 // status of the program.
 //
 // Threads:  one.
-// Blocking: tokens, pairings and the answer for one user wait for the hints service.
+// Blocking: tokens, pairings and the answer for one user wait for the hints service; the doctor
+// does
+//           for a moment.
 // In tests: tests/unit/vlmctl, tests/integration/vlmctl
 
 #pragma once
@@ -32,6 +34,10 @@ int listTokens(const Arguments& arguments, Output& output);
 
 // Who is paired with what: asked of the hints service, or read from its database by root.
 int listPairings(const Arguments& arguments, Output& output);
+
+// What keeps cards from working, and what to do about it. For a machine in a folder, what its files
+// tell.
+int examine(const Arguments& arguments, Output& output);
 
 // Runs the command line that these words make.
 int runCommandLine(const std::vector<std::string>& words, Output& output);

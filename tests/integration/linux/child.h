@@ -28,7 +28,7 @@ public:
         Environment environment{};
         std::optional<uid_t> user{};  // user and group id to run as; the caller must be root
     };
-    static constexpr std::chrono::milliseconds kPatience = std::chrono::seconds(20);
+    static constexpr std::chrono::milliseconds kPatience = std::chrono::seconds(60);
 
     // The program, looked for in PATH when it has no slash, and its arguments.
     explicit Child(std::vector<std::string> arguments) : Child(std::move(arguments), Options()) {}

@@ -13,8 +13,8 @@ using ::testing::StartsWith;
 namespace {
 
 constexpr const char* kWarning =
-    "Failed to store Login keychain unlock key. This version cannot store an "
-    "unlock key yet.\n";
+    "Failed to store Login keychain unlock key. The key that unlocks the login keyring can be "
+    "stored only for the user who is logged in at this computer.\n";
 
 class MainJob : public ::testing::Test {
 protected:

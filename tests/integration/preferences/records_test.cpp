@@ -6,7 +6,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <chrono>
+#include <ctime>
 #include <string>
 
 #include "platform/linux/file_preferences.h"
@@ -118,11 +118,11 @@ TEST_F(PreferencesRecordTest, ASparseFileOfTwoGibibytesIsAnsweredAtOnceAndInLitt
     ASSERT_EQ(::truncate(file.c_str(), off_t{2} << 30U), 0);
     rusage before{};
     ::getrusage(RUSAGE_SELF, &before);
-    const auto start = std::chrono::steady_clock::now();
+    const auto start = std::clock();
 
     EXPECT_EQ(anyValue(), std::nullopt);
 
-    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(100));
+    EXPECT_LT(std::clock() - start, CLOCKS_PER_SEC / 10) << "time of the processor";
     rusage after{};
     ::getrusage(RUSAGE_SELF, &after);
     EXPECT_LT(after.ru_maxrss - before.ru_maxrss, 16 * 1024) << "kibibytes";

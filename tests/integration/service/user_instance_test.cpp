@@ -124,6 +124,21 @@ TEST_F(UserInstanceTest, PassesListingsOn) {
     EXPECT_THAT(machine.callAgent({"op=1", "uid=0"}, kNobodyUser), StartsWith("res -2001\n"));
 }
 
+TEST_F(UserInstanceTest, SaysOfAUserWithoutALoginKeyringThatThereIsNone) {
+    start(machine.answeringPinentry());
+    const std::vector<std::string> name{"op=8", "uid=65534"};
+    const std::vector<std::string> unlock{"op=5", "uid=65534", "str1=x"};
+    const auto noKeyring = testing::AllOf(StartsWith("res -2021\n"), HasSubstr("no login keyring"));
+
+    EXPECT_THAT(machine.callAgent(unlock, kNobodyUser), noKeyring);
+    EXPECT_THAT(machine.call(unlock), noKeyring);
+    EXPECT_THAT(machine.call(name), noKeyring);
+    EXPECT_THAT(machine.call(name, kNobodyUser), noKeyring);
+    EXPECT_THAT(machine.call(name, kOtherUser), StartsWith("res -2001\n"));
+    EXPECT_THAT(machine.call({"op=8", "uid=4711"}),
+                testing::AllOf(StartsWith("res -2021\n"), HasSubstr("not logged in")));
+}
+
 TEST_F(UserInstanceTest, AsksItsUserForThePinOfALogin) {
     start(machine.answeringPinentry());
 

@@ -27,24 +27,6 @@ using namespace std::chrono_literals;
 class BadModulesTest : public TokensTest {
 protected:
     BadModulesTest() { cards.add("good", {identity("p256", "Alice")}); }
-
-    ~BadModulesTest() override {
-        if (!_script.empty()) std::filesystem::remove_all(_script.parent_path());
-    }
-
-    // A worker program that is a shell script. Folders in memory may not hold programs, so it does
-    // not lie with the cards.
-    void useWorkerScript(const std::string& commands) {
-        std::string folder = std::filesystem::temp_directory_path() / "vlm-worker-XXXXXX";
-        ASSERT_NE(mkdtemp(folder.data()), nullptr);
-        _script = std::filesystem::path(folder) / "worker";
-        std::ofstream(_script) << "#!/bin/sh\n" << commands << "\n";
-        chmod(_script.c_str(), 0700);
-        options.workerProgram = _script;
-    }
-
-private:
-    std::filesystem::path _script;
 };
 
 TEST_F(BadModulesTest, OneThatCrashesCostsOneWarning) {

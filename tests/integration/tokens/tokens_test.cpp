@@ -1,10 +1,13 @@
 #include "tests/integration/tokens/tokens_test.h"
 
+#include <sys/stat.h>
 #include <sys/wait.h>
 
 #include <algorithm>
 #include <cerrno>
 #include <chrono>
+#include <cstdlib>
+#include <fstream>
 
 namespace vlm::test {
 namespace {
@@ -35,6 +38,7 @@ TokensTest::TokensTest() {
 
 TokensTest::~TokensTest() {
     dropTokens();
+    if (!_script.empty()) std::filesystem::remove_all(_script.parent_path());
     EXPECT_TRUE(waitpid(-1, nullptr, WNOHANG) == -1 && errno == ECHILD) << "a process is left";
 }
 
@@ -86,6 +90,16 @@ Token TokensTest::tokenCalled(const std::string& name) {
 
 void TokensTest::configureModule(const std::string& name) {
     cards.configureModule(name, "module: " VLM_TEST_MODULES "/" + name + "_module.so\n");
+}
+
+// Folders in memory may not hold programs, so it does not lie with the cards.
+void TokensTest::useWorkerScript(const std::string& commands) {
+    std::string folder = std::filesystem::temp_directory_path() / "vlm-worker-XXXXXX";
+    ASSERT_NE(mkdtemp(folder.data()), nullptr);
+    _script = std::filesystem::path(folder) / "worker";
+    std::ofstream(_script) << "#!/bin/sh\n" << commands << "\n";
+    chmod(_script.c_str(), 0700);
+    options.workerProgram = _script;
 }
 
 void TokensTest::configureOnly(const std::string& name) {

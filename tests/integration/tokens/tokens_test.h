@@ -2,6 +2,7 @@
 
 #pragma once
 
+#include <filesystem>
 #include <optional>
 #include <string>
 #include <vector>
@@ -45,6 +46,9 @@ protected:
     void configureModule(const std::string& name);
     void configureOnly(const std::string& name);
 
+    // A worker program that is a shell script; what it is asked comes on descriptor 3.
+    void useWorkerScript(const std::string& commands);
+
     std::vector<std::string> warnings() { return log().texts(platform::LogLevel::Error); }
 
     sd_event* event() { return _event.get(); }
@@ -53,6 +57,7 @@ protected:
 private:
     std::unique_ptr<sd_event, EventUnref> _event;
     std::unique_ptr<service::WorkerTokens> _tokens;
+    std::filesystem::path _script;
 };
 
 std::vector<std::string> namesOf(const std::vector<Identity>& identities);

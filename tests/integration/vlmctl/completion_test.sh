@@ -26,10 +26,13 @@ expect() {
 }
 
 expect 'settings set' vlmctl se
-expect 'settings get set unset check tokens pairings' vlmctl ''
+expect 'settings get set unset check tokens pairings doctor' vlmctl ''
 expect 'enforceSmartCard' vlmctl set enf
 expect 'allowSmartCard allowUnmappedUsers' vlmctl get all
 expect 'on off' vlmctl --json set UserPairing ''
+expect 'none lock logout' vlmctl set tokenRemovalAction ''
+expect 'doctor' vlmctl --root /tmp doc
+expect '--root' vlmctl doctor --r
 expect '' vlmctl tokens ''
 expect '--user' vlmctl settings --u
 expect '' vlmctl tokens --u

@@ -51,7 +51,7 @@ done <<<"$settings"
 for option in $("$vlmctl" --help | grep -oE -- '--[a-z-]+' | sort -u); do
     tells vlmctl.1 "^\.It .*Fl -${option#--}( |\$)"
 done
-for word in settings get set unset check tokens pairings; do tells vlmctl.1 "^\.It Cm $word"; done
+for word in settings get set unset check tokens pairings doctor; do tells vlmctl.1 "^\.It Cm $word"; done
 letters=$(sed -nE 's/.*kOptions = "\+([a-z:]+)".*/\1/p' "$source/tool/options.cpp")
 [[ $letters ]] || fail "the options of vlmbind were not found"
 while read -rn 1 letter; do

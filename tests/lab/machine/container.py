@@ -32,14 +32,16 @@ class Container:
     def is_up(self) -> bool:
         return self._leader() is not None
 
-    def up(self, build: Path, ends_with_us: bool = False) -> None:
+    def up(
+        self, build: Path, ends_with_us: bool = False, more_packages: tuple[str, ...] = ()
+    ) -> None:
         """Boots; returns when the machine and the desktop at its console are ready. A machine that
         ends with us does so however this process ends; what is left then, the next one clears."""
         if self.is_up():
             raise LabError(f"the machine {self.name} is up already")
         self.down()
         _clear_orphans()
-        layers = image.layers()
+        layers = image.layers(more_packages)
         try:
             self._state.mkdir(parents=True)
             if ends_with_us:

@@ -10,7 +10,7 @@ from dataclasses import dataclass
 
 from machine.container import Container, LabError
 
-PATIENCE_SECONDS = 20
+PATIENCE_SECONDS = 40
 ANSWERS = "/run/vlm-lab"
 
 

@@ -29,11 +29,14 @@ def packages() -> list[str]:
     return [line for line in lines if line and not line.startswith("#")]
 
 
-def layers() -> list[Path]:
+def layers(more_packages: tuple[str, ...] = ()) -> list[Path]:
     """The folders of the layers, the uppermost first; made when they are not there yet."""
     CACHE.mkdir(mode=0o755, parents=True, exist_ok=True)
+    wanted = [*packages(), *more_packages]
     with _only_one():
-        base = _layer("packages", _packages_recipe(), _make_packages)
+        base = _layer(
+            "packages", _packages_recipe(wanted), lambda target: _make_packages(wanted, target)
+        )
         lab = _layer("lab", _lab_recipe(base), lambda target: _make_lab(base, target))
         _forget_old()
     return [lab, base]
@@ -75,8 +78,8 @@ def _codename() -> str:
     return release["VERSION_CODENAME"]
 
 
-def _packages_recipe() -> bytes:
-    return "\n".join([_codename(), platform.machine(), *packages(), *_MMDEBSTRAP]).encode()
+def _packages_recipe(wanted: list[str]) -> bytes:
+    return "\n".join([_codename(), platform.machine(), *wanted, *_MMDEBSTRAP]).encode()
 
 
 # Documents and translations are two thirds of the files of some packages.
@@ -91,11 +94,11 @@ _MMDEBSTRAP = [
 ]
 
 
-def _make_packages(target: Path) -> None:
+def _make_packages(wanted: list[str], target: Path) -> None:
     sources = [str(each) for each in sorted(Path("/etc/apt").glob("sources.list.d/*.sources"))]
     if Path("/etc/apt/sources.list").exists():
         sources.append("/etc/apt/sources.list")
-    include = "--include=" + ",".join(packages())
+    include = "--include=" + ",".join(wanted)
     _run(["mmdebstrap", *_MMDEBSTRAP, include, _codename(), str(target), *sources])
 
 

@@ -238,7 +238,7 @@ TEST_F(UnlockKeyStoringTest, AsksNothingForACallerWhoLeftBeforeTheCardAnswered) 
 TEST_F(UnlockKeyStoringTest, ServesOthersWhileAPersonTypes) {
     ask(alice(), store());
 
-    EXPECT_EQ(result(ask(root(), requestOf(6, {{"str1", "alice"}}))), 0);
+    EXPECT_EQ(result(ask(root(), requestOf(6, {{"str1", "alice"}}))), 1);
     EXPECT_EQ(keyrings.passwords.count(), 1u);
 }
 

@@ -2,7 +2,7 @@
 
 #include <sys/stat.h>
 
-#include <chrono>
+#include <ctime>
 #include <fstream>
 #include <sstream>
 
@@ -116,11 +116,11 @@ TEST_F(SmartcardConfiguration, OfTheLargestSizeIsStillRead) {
 TEST_F(SmartcardConfiguration, OfTwoGibibytesCostsNoTime) {
     write("bplist00");
     fs::resize_file(file, std::uintmax_t{2} << 30U);
-    const auto start = std::chrono::steady_clock::now();
+    const auto start = std::clock();
 
     EXPECT_FALSE(copySmartCardConfiguration(file));
 
-    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(100));
+    EXPECT_LT(std::clock() - start, CLOCKS_PER_SEC / 10) << "time of the processor";
     EXPECT_EQ(logged(), Lines{"error: Failed to create data for plist"});
 }
 

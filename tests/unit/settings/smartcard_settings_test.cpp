@@ -1,5 +1,6 @@
 #include "settings/smartcard_settings.h"
 
+#include "settings/smartcard_settings_worker.h"
 #include "settings_fixture.h"
 
 namespace vlm {
@@ -22,6 +23,7 @@ TEST_F(SmartcardSetting, HasItsDefaultWhenNothingIsStored) {
         {"useLocalOd", 0, "off"},
         {"enforceSmartCard", 0, "off"},
         {"allowUnmappedUsers", 0, "off"},
+        {"tokenRemovalAction", 0, "nothing is done"},
         {"noSuchSetting", 0, "an unknown key"},
         {"userpairing", 0, "keys are case-sensitive"},
         {"UserPairing ", 0, "keys are compared exactly"},
@@ -32,6 +34,16 @@ TEST_F(SmartcardSetting, HasItsDefaultWhenNothingIsStored) {
         EXPECT_EQ(VLGetSmartcardSetting(row.key), row.value);
         EXPECT_EQ(VLGetSmartcardSettingOrigin(row.key), SmartcardSettingOrigin::Default);
     }
+}
+
+TEST_F(SmartcardSetting, IsToldWithoutALineToWhoAsksAgainAndAgain) {
+    EXPECT_EQ(settingNow("allowSmartCard"), 1);
+    setForMachine("allowSmartCard", false);
+    EXPECT_EQ(settingNow("allowSmartCard"), 0);
+    force("allowSmartCard", 5);
+    EXPECT_EQ(settingNow("allowSmartCard"), 5);
+
+    EXPECT_TRUE(log().lines().empty());
 }
 
 TEST_F(SmartcardSetting, IsWhatIsSetForTheMachine) {
