@@ -64,8 +64,7 @@ struct Application {
         *responses = nullptr;
         if (choices.flag()) {
             *responses = static_cast<pam_response*>(std::calloc(1, sizeof(pam_response)));
-            if (choices.flag())
-                (*responses)->resp = strdup(choices.text().c_str());
+            if (choices.flag()) (*responses)->resp = strdup(choices.text().c_str());
         }
         return choices.flag() ? PAM_SUCCESS : choices.byte() % 40 - 1;
     }

@@ -21,7 +21,8 @@ public:
     bool isOver() const { return !_isAny && Clock::now() >= _end; }
     std::uint64_t microsecondsLeft() const {
         if (_isAny) return UINT64_MAX;
-        const auto left = std::chrono::duration_cast<std::chrono::microseconds>(_end - Clock::now());
+        const auto left =
+            std::chrono::duration_cast<std::chrono::microseconds>(_end - Clock::now());
         return std::uint64_t(std::max(left.count(), std::int64_t{0}));
     }
 

@@ -131,11 +131,11 @@ void HintsService::logInWithCard(const Caller& caller, Request request, const An
     if (!number) return;
     const CardLoginParts parts{_parts.login, _parts.changes.sessions, _loginPolicy,
                                _parts.unlockKeys.keys};
-    const auto login = std::make_shared<CardLogin>(
-        parts, caller, std::move(request),
-        [this, number = *number, answer](Outcome<Message> outcome) {
-            end(number, std::move(outcome), answer);
-        });
+    const auto login =
+        std::make_shared<CardLogin>(parts, caller, std::move(request),
+                                    [this, number = *number, answer](Outcome<Message> outcome) {
+                                        end(number, std::move(outcome), answer);
+                                    });
     _running[*number].work = login;
     login->start();
 }

@@ -101,10 +101,11 @@ void Login::prove(Secret pin) {
         return refuse(status::kCardFailed,
                       "the system has no random numbers to challenge it with.");
     _challenge = std::move(*challenge);
-    _parts.tokens.prove({_token.identifier, _identity.publicKeyHash, _challenge, std::move(pin), _open},
-                        [weak = weak_from_this()](const Proof& proof) {
-                            if (const auto self = weak.lock()) self->judge(proof);
-                        });
+    _parts.tokens.prove(
+        {_token.identifier, _identity.publicKeyHash, _challenge, std::move(pin), _open},
+        [weak = weak_from_this()](const Proof& proof) {
+            if (const auto self = weak.lock()) self->judge(proof);
+        });
 }
 
 void Login::judge(const Proof& proof) {

@@ -105,8 +105,8 @@ Outcome<std::vector<LoginPolicy::Candidate>> LoginPolicy::candidates(
             for (const auto& pairing : *pairings) found.push_back({pairing, &token, &identity});
         }
     }
-    std::ranges::stable_sort(
-        found, std::greater(), [](const Candidate& each) { return each.pairing.sequence; });
+    std::ranges::stable_sort(found, std::greater(),
+                             [](const Candidate& each) { return each.pairing.sequence; });
     return found;
 }
 
@@ -127,16 +127,18 @@ std::optional<Refusal> LoginPolicy::whyNotAccepted(const Candidate& candidate) c
     if (candidate.token->pinState != PinState::Locked) return std::nullopt;
     return Refusal{
         status::kPinLocked,
-        platform::text("Logging in with \"{}\" of the card \"{}\": the card's PIN is locked. Unlock "
-                       "it with the PUK, or ask who issued it.",
-                       candidate.identity->name, candidate.token->name)};
+        platform::text(
+            "Logging in with \"{}\" of the card \"{}\": the card's PIN is locked. Unlock "
+            "it with the PUK, or ask who issued it.",
+            candidate.identity->name, candidate.token->name)};
 }
 
 Refusal LoginPolicy::noCard(const std::optional<std::string>& account) const {
     if (requiresCard(account))
         return {status::kCardRequired,
-                attempt(account) + ": only a card that is paired with the account lets you in "
-                                   "here. Insert it and try again."};
+                attempt(account) +
+                    ": only a card that is paired with the account lets you in "
+                    "here. Insert it and try again."};
     return {status::kNoLoginCard, attempt(account) + ": no such card is inserted."};
 }
 

@@ -1,7 +1,8 @@
 // LoginSession: whether a login may be asked for from where the caller is.
 //
 // Root's programs let people in: there is no session yet. A program of a user asks for a card that
-// is in this machine, so it has to be in a session here; a locked one is what a screen locker is in.
+// is in this machine, so it has to be in a session here; a locked one is what a screen locker is
+// in.
 //
 // Ownership: destroying it gives the question up. Threads: the event loop's. Blocking: no.
 
@@ -34,8 +35,7 @@ public:
             refused(status::kUnattended, request,
                     "a card is taken only from who sits at this machine, in the foreground.");
         _question = _sessions.ask(_caller, [refusal, answer](SessionState state) {
-            const bool isHere =
-                state == SessionState::Attended || state == SessionState::Locked;
+            const bool isHere = state == SessionState::Attended || state == SessionState::Locked;
             answer(isHere ? std::nullopt : std::optional(refusal));
         });
     }

@@ -66,8 +66,8 @@ int AfterLogin::openSession() {
     return isDone(exchange(request, patience)) ? PAM_SUCCESS : PAM_SESSION_ERR;
 }
 
-// Where the former password is not known, as when an administrator sets a new one, the keyring keeps
-// its own, and so does the card.
+// Where the former password is not known, as when an administrator sets a new one, the keyring
+// keeps its own, and so does the card.
 int AfterLogin::changePassword() {
     if (!transaction.knowsFormerToken()) return PAM_SUCCESS;
     const auto token = transaction.token();

@@ -18,9 +18,9 @@ constexpr const char* kNoService =
 constexpr const char* kKeyringAsks = "The login keyring will ask for its password.";
 
 const char* nameOf(Found::Kind kind) {
-    constexpr const char* kNames[] = {"a card",           "no card",     "no card, which is required",
-                                      "a refused card",   "a locked PIN", "no decision",
-                                      "an unclear answer"};
+    constexpr const char* kNames[] = {
+        "a card",       "no card",     "no card, which is required", "a refused card",
+        "a locked PIN", "no decision", "an unclear answer"};
     return kNames[static_cast<int>(kind)];
 }
 
@@ -32,8 +32,8 @@ int Authentication::run() {
     return user.empty() ? logInNobodyInParticular() : logIn(user);
 }
 
-// The card may say who it is. Where it does not, the person is asked, and the rules for that account
-// count.
+// The card may say who it is. Where it does not, the person is asked, and the rules for that
+// account count.
 int Authentication::logInNobodyInParticular() {
     const auto found = search("");
     if (found.kind == Found::Kind::Card) return logInWith("", found.card);
@@ -75,8 +75,7 @@ int Authentication::askForPin(const FoundCard& card, service::Secret& pin) {
         transaction().warn("Only one try is left. A wrong PIN now locks the card.");
     else if (card.hasFewTriesLeft)
         transaction().inform("Only a few tries are left before the card is locked.");
-    auto answer =
-        transaction().askSecretly(platform::text("PIN of the card \"{}\": ", card.name));
+    auto answer = transaction().askSecretly(platform::text("PIN of the card \"{}\": ", card.name));
     if (answer.result == PAM_SUCCESS && answer.text) pin = std::move(*answer.text);
     return answer.result;
 }

@@ -1,8 +1,8 @@
 // Authentication: one login with a card, from the search for it to PAM's return value.
 //
-// What may be done is decided by the service; here is only what a person is asked and told, and what
-// each answer means to the other modules. docs/login.md has the table. No error is passed over as if
-// nothing had been, and nobody is let in without the service's own word.
+// What may be done is decided by the service; here is only what a person is asked and told, and
+// what each answer means to the other modules. docs/login.md has the table. No error is passed over
+// as if nothing had been, and nobody is let in without the service's own word.
 //
 // Threads: the application's. Blocking: for the person, the service and the card.
 // Errors:  PAM's return values.

@@ -9,12 +9,12 @@
 
 #include <exception>
 
+#include "platform/export.h"
 #include "services/pam/after_login.h"
 #include "services/pam/authentication.h"
 #include "services/pam/exchange.h"
 #include "services/pam/options.h"
 #include "services/pam/pam_transaction.h"
-#include "platform/export.h"
 #include "settings/smartcard_configuration.h"
 #include "settings/smartcard_settings_worker.h"
 
@@ -54,10 +54,11 @@ int guarded(pam_handle_t* handle, int flags, int count, const char** words, Work
 
 template <typename Step>
 int afterLogin(pam_handle_t* handle, int flags, int count, const char** words, Step step) {
-    return guarded(handle, flags, count, words, [&](Transaction& transaction, const Options& options) {
-        AfterLogin after{transaction, exchangeOn(options.bus), options.patience};
-        return (after.*step)();
-    });
+    return guarded(handle, flags, count, words,
+                   [&](Transaction& transaction, const Options& options) {
+                       AfterLogin after{transaction, exchangeOn(options.bus), options.patience};
+                       return (after.*step)();
+                   });
 }
 
 }  // namespace
@@ -65,10 +66,12 @@ int afterLogin(pam_handle_t* handle, int flags, int count, const char** words, S
 extern "C" {
 
 VLM_EXPORT int pam_sm_authenticate(pam_handle_t* handle, int flags, int count, const char** words) {
-    return guarded(handle, flags, count, words, [](Transaction& transaction, const Options& options) {
-        return Authentication({transaction, exchangeOn(options.bus), options.patience, requiresCard})
-            .run();
-    });
+    return guarded(
+        handle, flags, count, words, [](Transaction& transaction, const Options& options) {
+            return Authentication(
+                       {transaction, exchangeOn(options.bus), options.patience, requiresCard})
+                .run();
+        });
 }
 
 VLM_EXPORT int pam_sm_setcred(pam_handle_t*, int, int, const char**) { return PAM_SUCCESS; }

@@ -57,7 +57,8 @@ struct Person {
 
 int converse(int count, const pam_message** messages, pam_response** responses, void* person) {
     auto& self = *static_cast<Person*>(person);
-    auto* made = static_cast<pam_response*>(calloc(static_cast<std::size_t>(count), sizeof(**responses)));
+    auto* made =
+        static_cast<pam_response*>(calloc(static_cast<std::size_t>(count), sizeof(**responses)));
     bool hasAnswered = true;
     for (int each = 0; each < count; ++each) {
         const int style = messages[each]->msg_style;
@@ -101,7 +102,8 @@ void letIn(Person person, const char* folder, const char* service) {
         person.print("session " + std::to_string(pam_open_session(handle, 0)));
         pam_close_session(handle, 0);
     }
-    if (person.has("password")) person.print("password " + std::to_string(pam_chauthtok(handle, 0)));
+    if (person.has("password"))
+        person.print("password " + std::to_string(pam_chauthtok(handle, 0)));
     pam_end(handle, result);
 }
 
@@ -160,7 +162,8 @@ int main(int argc, char* argv[]) {
     const auto descriptors = entriesOf("/proc/self/fd");
     const auto signals = signalsHandled();
     work.person.has("small-stack") ? runOnSmallStack(work) : work.run();
-    work.person.print("more descriptors " + std::to_string(entriesOf("/proc/self/fd") - descriptors));
+    work.person.print("more descriptors " +
+                      std::to_string(entriesOf("/proc/self/fd") - descriptors));
     work.person.print("threads " + std::to_string(entriesOf("/proc/self/task")));
     work.person.print(signalsHandled() == signals ? "signals as before" : "signals differ");
 }

@@ -30,11 +30,11 @@ protected:
 
     // The module as the only one, with what it is told.
     void writeService(const std::string& options) {
-        const std::string module = std::string(VLM_PAM_MODULE) + " bus=" +
-                                   machine.systemBus().address() + " " + options + "\n";
-        machine.folder().write("vlm-test",
-                               "auth required " + module + "account required " + module +
-                                   "session required " + module + "password required " + module);
+        const std::string module = std::string(VLM_PAM_MODULE) +
+                                   " bus=" + machine.systemBus().address() + " " + options + "\n";
+        machine.folder().write("vlm-test", "auth required " + module + "account required " +
+                                               module + "session required " + module +
+                                               "password required " + module);
     }
     void pair(const std::string& account) {
         ASSERT_THAT(machine.call(machine.login({"str2=123456"})), StartsWith("res 0"));
@@ -68,9 +68,8 @@ TEST_F(PamVlmTest, LogsInWithCardAndPin) {
 TEST_F(PamVlmTest, NamesTheUserWhomTheCardBelongsTo) {
     startWithPairedCard();
 
-    EXPECT_THAT(said({"pin=123456"}),
-                AllOf(HasSubstr(authenticated(PAM_SUCCESS)), HasSubstr("user daemon\n"),
-                      Not(HasSubstr("shown: "))));
+    EXPECT_THAT(said({"pin=123456"}), AllOf(HasSubstr(authenticated(PAM_SUCCESS)),
+                                            HasSubstr("user daemon\n"), Not(HasSubstr("shown: "))));
 }
 
 TEST_F(PamVlmTest, LeavesThePasswordWayOpenWithoutACard) {
@@ -136,12 +135,12 @@ TEST_F(PamVlmTest, LetsNobodyUseAnAccountThatIsNoLongerPaired) {
     startWithPairedCard();
     // After the login, before the account is looked at.
     machine.folder().write(
-        "vlm-test", std::string("auth required ") + VLM_PAM_MODULE + " bus=" +
-                        machine.systemBus().address() + "\nauth required pam_exec.so " +
+        "vlm-test", std::string("auth required ") + VLM_PAM_MODULE +
+                        " bus=" + machine.systemBus().address() + "\nauth required pam_exec.so " +
                         machine.folder().path().string() + "/unpair\naccount required " +
                         VLM_PAM_MODULE + " bus=" + machine.systemBus().address() + "\n");
-    std::string script = "#!/bin/sh\nexec env DBUS_SYSTEM_BUS_ADDRESS=" +
-                         machine.systemBus().address();
+    std::string script =
+        "#!/bin/sh\nexec env DBUS_SYSTEM_BUS_ADDRESS=" + machine.systemBus().address();
     for (const auto& word :
          machine.callCommand(kDaemon, {"op=3", "dat1=" + machine.hash(), "str1=daemon"}))
         script += " " + word;

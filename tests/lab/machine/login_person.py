@@ -110,7 +110,9 @@ def pair(lab, account: str, name: str, card: str, reader: int = 1) -> str:
     """As pair_by_hand, of a card whose identity is offered under that name."""
     lab.insert(card, reader)
     hash_ = only_identity(lab, name)
-    done = lab.root("/usr/lib/vlm-lab/ask-hints", f"login {hash_} 123456", f"pair {account} {hash_}")
+    done = lab.root(
+        "/usr/lib/vlm-lab/ask-hints", f"login {hash_} 123456", f"pair {account} {hash_}"
+    )
     check.assertEqual(done.output.split(), ["0", "0"], done)
     return hash_
 
@@ -124,10 +126,10 @@ def hash_of(lab, card: str) -> str:
     return hash_ if hash_ in listed else ""
 
 
-def greet(lab, user: str, terminal: str = ":0") -> Terminal:
+def greet(lab, user: str, terminal: str = ":0", environment: str = "LANG=C") -> Terminal:
     """A display manager's greeter, which knows whose name was clicked."""
-    items = ["-I", f"tty={terminal}"]
-    return Terminal(lab, "pamtester", *items, "lab-display-manager", user, "authenticate", "acct_mgmt")
+    what = ["lab-display-manager", user, "authenticate", "acct_mgmt"]
+    return Terminal(lab, "env", environment, "pamtester", "-I", f"tty={terminal}", *what)
 
 
 def greeted_with(lab, user: str, terminal: str = ":0", **typed: str) -> str:

@@ -61,9 +61,12 @@ TEST(ConversationTest, BelievesNoAnswerOfAnApplicationThatFailed) {
         int result;
         bool givesResponse;
         int expected;
-    } const rows[] = {{PAM_CONV_ERR, true, PAM_CONV_ERR},   {PAM_CONV_ERR, false, PAM_CONV_ERR},
-                      {PAM_SUCCESS, false, PAM_CONV_ERR},   {PAM_ABORT, true, PAM_CONV_ERR},
-                      {PAM_CONV_AGAIN, true, PAM_INCOMPLETE}, {-1, true, PAM_CONV_ERR},
+    } const rows[] = {{PAM_CONV_ERR, true, PAM_CONV_ERR},
+                      {PAM_CONV_ERR, false, PAM_CONV_ERR},
+                      {PAM_SUCCESS, false, PAM_CONV_ERR},
+                      {PAM_ABORT, true, PAM_CONV_ERR},
+                      {PAM_CONV_AGAIN, true, PAM_INCOMPLETE},
+                      {-1, true, PAM_CONV_ERR},
                       {12345, true, PAM_CONV_ERR}};
     for (const auto& row : rows) {
         application.result = row.result;

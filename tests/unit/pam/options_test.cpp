@@ -31,8 +31,9 @@ TEST(PamOptionsTest, ReadEachWord) {
 }
 
 TEST(PamOptionsTest, LeaveOutWhatIsNotUnderstood) {
-    for (const char* word : {"timeout=", "timeout=0", "timeout=-1", "timeout=601", "timeout=5s",
-                             "timeout=99999999999999999999", "bus=", "Debug", "", "use_first_pass"}) {
+    for (const char* word :
+         {"timeout=", "timeout=0", "timeout=-1", "timeout=601", "timeout=5s",
+          "timeout=99999999999999999999", "bus=", "Debug", "", "use_first_pass"}) {
         const auto options = read({word, "debug"});
 
         EXPECT_THAT(options.notUnderstood, ElementsAre(word));

@@ -28,9 +28,9 @@ inline platform::Message numbered(std::int64_t number) {
 
 inline Reply refusal(std::int64_t status, const std::string& text = "the reason.") {
     auto reply = numbered(status);
-    platform::encodeReplyError({std::string(platform::VLErrorDomain),
-                                static_cast<platform::Status>(status), text},
-                               &reply);
+    platform::encodeReplyError(
+        {std::string(platform::VLErrorDomain), static_cast<platform::Status>(status), text},
+        &reply);
     return reply;
 }
 

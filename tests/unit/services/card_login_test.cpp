@@ -25,9 +25,8 @@ protected:
 
     // What the card's wrap key can open from now on.
     void storeUnlockKey(const std::string& password, const std::string& account = "alice") {
-        const auto wrapped =
-            wrapUnlockKey(Secret(password), {account, hashOf(1), wrapKey.hash()},
-                          wrapKey.publicInfo(), WrapScheme::RsaOaepSha256);
+        const auto wrapped = wrapUnlockKey(Secret(password), {account, hashOf(1), wrapKey.hash()},
+                                           wrapKey.publicInfo(), WrapScheme::RsaOaepSha256);
         ASSERT_TRUE(wrapped);
         ASSERT_EQ(pairings.storeUnlockKey(
                       {"alice", hashOf(1), wrapKey.hash(), wrapKey.publicInfo(), *wrapped}),

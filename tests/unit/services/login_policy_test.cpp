@@ -120,9 +120,9 @@ TEST_F(LoginPolicyTest, TakesACertificateFromItsFirstToItsLastSecond) {
         std::int64_t now;
         const char* answer;
     };
-    for (const auto& [second, answer] : {Row{kNow - 11, "refused -2020"}, Row{kNow - 10, "alice a A"},
-                                         Row{kNow + 10, "alice a A"},
-                                         Row{kNow + 11, "refused -2020"}}) {
+    for (const auto& [second, answer] :
+         {Row{kNow - 11, "refused -2020"}, Row{kNow - 10, "alice a A"}, Row{kNow + 10, "alice a A"},
+          Row{kNow + 11, "refused -2020"}}) {
         now = second;
         EXPECT_EQ(cardOf("alice", inserted), answer) << second;
     }
@@ -276,7 +276,8 @@ TEST_F(LoginPolicyTest, JudgesOneCardByTheSameRules) {
     pair("bob", 2);
     const std::vector<Token> inserted{
         card("a", {identityOf(1, "A"), identityOf(2, "B"), expired(3)})};
-    const auto judged = [&](const std::string& account, const std::string& token, std::uint8_t key) {
+    const auto judged = [&](const std::string& account, const std::string& token,
+                            std::uint8_t key) {
         return chosen(policy.thisCard(account, "pkcs11:token=" + token, hashOf(key), inserted));
     };
 

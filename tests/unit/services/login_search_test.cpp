@@ -86,7 +86,8 @@ TEST_F(LoginSearchTest, ServesAUserInASessionAtThisMachine) {
     };
     for (const auto& [state, status] :
          {Row{SessionState::Attended, 0}, Row{SessionState::Locked, 0},
-          Row{SessionState::None, status::kUnattended}, Row{SessionState::Away, status::kUnattended},
+          Row{SessionState::None, status::kUnattended},
+          Row{SessionState::Away, status::kUnattended},
           Row{SessionState::Inactive, status::kUnattended},
           Row{SessionState::Unknown, status::kUnattended}}) {
         sessions.state = state;

@@ -12,7 +12,8 @@ using testing::HasSubstr;
 class SessionLoginTest : public HintsServiceTest {
 protected:
     static IncomingRequest note(const std::string& session) {
-        return requestOf(14, {{"str1", session}, {"str2", text("alice")}, {"str3", text("pkcs11:token=a")}});
+        return requestOf(
+            14, {{"str1", session}, {"str2", text("alice")}, {"str3", text("pkcs11:token=a")}});
     }
 };
 
