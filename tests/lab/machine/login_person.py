@@ -65,8 +65,8 @@ class Terminal:
         self._process.wait(PATIENCE_SECONDS)
         return self.shown
 
-    def close(self) -> str:
-        self._process.terminate()
+    def give_up(self) -> str:
+        os.write(self._ours, b"\x03")
         return self.end()
 
     def _read(self, seconds: float) -> bool:
@@ -96,25 +96,25 @@ def _pam_auth_update(lab, verb: str) -> None:
     check.assertEqual(done.status, 0, done)
 
 
-def pair_by_hand(lab, account: str, card: str, reader: int = 1) -> str:
-    """A card that is in; by root, without any question. The hash of its first identity."""
+def pair(lab, account: str, name: str, card: str, reader: int = 1) -> str:
+    """Inserts a card and pairs it, without any question; the hash of its identity with that name."""
     lab.insert(card, reader)
-    ask = "/usr/lib/vlm-lab/ask-hints"
-    hash_ = lab.wait_until(f"{card} is listed", lambda: hash_of(lab, card))
-    done = lab.root(ask, f"login {hash_} 123456", f"pair {account} {hash_}")
-    check.assertEqual(done.output.split(), ["0", "0"], done)
+    hash_ = only_identity(lab, name)
+    pair_inserted(lab, account, hash_)
     return hash_
 
 
-def pair(lab, account: str, name: str, card: str, reader: int = 1) -> str:
-    """As pair_by_hand, of a card whose identity is offered under that name."""
-    lab.insert(card, reader)
-    hash_ = only_identity(lab, name)
+def pair_unoffered(lab, account: str, card: str) -> None:
+    """Likewise for a card whose identity nobody is offered any more."""
+    lab.insert(card)
+    pair_inserted(lab, account, lab.wait_until(f"{card} is in", lambda: hash_of(lab, card)))
+
+
+def pair_inserted(lab, account: str, hash_: str) -> None:
     done = lab.root(
         "/usr/lib/vlm-lab/ask-hints", f"login {hash_} 123456", f"pair {account} {hash_}"
     )
     check.assertEqual(done.output.split(), ["0", "0"], done)
-    return hash_
 
 
 def hash_of(lab, card: str) -> str:
@@ -126,16 +126,27 @@ def hash_of(lab, card: str) -> str:
     return hash_ if hash_ in listed else ""
 
 
-def greet(lab, user: str, terminal: str = ":0", environment: str = "LANG=C") -> Terminal:
+class Greeter(Terminal):
     """A display manager's greeter, which knows whose name was clicked."""
-    what = ["lab-display-manager", user, "authenticate", "acct_mgmt"]
-    return Terminal(lab, "env", environment, "pamtester", "-I", f"tty={terminal}", *what)
+
+    # What a program shows just before it ends may get lost on the way, so its end is waited for.
+    AND_SAY_WHEN_DONE = '"$@"; echo "(ended with $?)"; read -r wait'
+    DONE = re.compile(r"\(ended with \d+\)")
+
+    def __init__(self, lab, user: str, terminal: str = ":0", environment: str = "LANG=C") -> None:
+        what = ["lab-display-manager", user, "authenticate", "acct_mgmt"]
+        program = ["env", environment, "pamtester", "-I", f"tty={terminal}", *what]
+        super().__init__(lab, "sh", "-c", self.AND_SAY_WHEN_DONE, "sh", *program)
+
+    def end(self) -> str:
+        self.answer(self.DONE, "")
+        return super().end()
 
 
 def greeted_with(lab, user: str, terminal: str = ":0", **typed: str) -> str:
     """What the greeter shows when the person types these answers, a PIN or a password."""
     prompts = {"pin": PIN_PROMPT, "password": PASSWORD_PROMPT}
-    greeter = greet(lab, user, terminal)
+    greeter = Greeter(lab, user, terminal)
     for which, text in typed.items():
         greeter.answer(prompts[which], text)
     return greeter.end()
@@ -148,3 +159,4 @@ def check_let_in(shown: str) -> None:
 
 def check_kept_out(shown: str) -> None:
     check.assertNotIn("successfully authenticated", shown)
+    check.assertRegex(shown, r"\(ended with [1-9]")

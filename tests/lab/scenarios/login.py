@@ -9,7 +9,7 @@ from machine.login_person import (
     check_let_in,
     greeted_with,
     pair,
-    pair_by_hand,
+    pair_inserted,
     turn_off,
     turn_on,
 )
@@ -124,19 +124,18 @@ def each_of_two_cards_logs_in_its_own(lab):
     terminal = Terminal(lab, "login")
     terminal.answer(NAME_PROMPT, "bob")
     check.assertIn(BOB, terminal.wait_for(PIN_PROMPT))
-    terminal.close()
+    terminal.give_up()
 
 
 def two_accounts_share_a_card(lab):
     turn_on(lab)
-    pair(lab, "alice", ALICE, "rsa")
-    pair_by_hand(lab, "bob", "rsa")
+    pair_inserted(lab, "bob", pair(lab, "alice", ALICE, "rsa"))
 
     check_let_in(greeted_with(lab, "alice", pin="123456"))
     check_let_in(greeted_with(lab, "bob", pin="123456"))
     terminal = Terminal(lab, "login")
     terminal.wait_for(NAME_PROMPT)
-    terminal.close()
+    terminal.give_up()
 
 
 def _shells(lab, user: str) -> list[str]:

@@ -5,12 +5,12 @@ import statistics
 from machine.checks import check
 from machine.login_person import (
     PIN_PROMPT,
+    Greeter,
     check_kept_out,
     check_let_in,
-    greet,
     greeted_with,
     pair,
-    pair_by_hand,
+    pair_unoffered,
     turn_on,
 )
 
@@ -45,7 +45,7 @@ def the_last_try_is_told_and_then_the_pin_is_locked(lab):
     check.assertIn("Only one try is left", shown)
     check.assertIn("locked", shown)
 
-    again = greet(lab, "alice").end()
+    again = Greeter(lab, "alice").end()
     check_kept_out(again)
     check.assertIn("the card's PIN is locked", again)
     check.assertNotIn("PIN of the card", again)
@@ -54,7 +54,7 @@ def the_last_try_is_told_and_then_the_pin_is_locked(lab):
 def a_card_that_is_pulled_before_its_pin_lets_nobody_in(lab):
     turn_on(lab)
     pair(lab, "alice", ALICE, "rsa")
-    greeter = greet(lab, "alice")
+    greeter = Greeter(lab, "alice")
     greeter.wait_for(PIN_PROMPT)
 
     lab.remove()
@@ -86,9 +86,9 @@ def the_card_of_another_lets_nobody_in(lab):
 
 def an_expired_card_lets_nobody_in(lab):
     turn_on(lab)
-    pair_by_hand(lab, "alice", "expired")
+    pair_unoffered(lab, "alice", "expired")
 
-    shown = greet(lab, "alice").end()
+    shown = Greeter(lab, "alice").end()
 
     check_kept_out(shown)
     check.assertIn("expired", shown)
@@ -98,7 +98,7 @@ def an_expired_card_lets_nobody_in(lab):
 def who_is_unpaired_meanwhile_may_not_use_the_account(lab):
     turn_on(lab)
     hash_ = pair(lab, "alice", ALICE, "rsa")
-    greeter = greet(lab, "alice")
+    greeter = Greeter(lab, "alice")
     greeter.wait_for(PIN_PROMPT)
 
     lab.root("/usr/lib/vlm-lab/ask-hints", f"unpair alice {hash_}")

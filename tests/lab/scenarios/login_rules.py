@@ -2,9 +2,9 @@
 
 from machine.checks import check
 from machine.login_person import (
+    Greeter,
     check_kept_out,
     check_let_in,
-    greet,
     greeted_with,
     pair,
     turn_on,
@@ -21,7 +21,7 @@ def the_password_is_asked_for_while_the_service_is_down(lab):
 
     check_let_in(greeted_with(lab, "alice", password="pw-alice"))
     lab.root("vlmctl", "set", "enforceSmartCard", "1")
-    shown = greet(lab, "alice").end()
+    shown = Greeter(lab, "alice").end()
     check_kept_out(shown)
     check.assertIn("does not answer", shown)
     check_let_in(greeted_with(lab, "root", "/dev/tty1", password="pw-root"))
@@ -34,7 +34,7 @@ def the_password_is_asked_for_while_the_service_hangs(lab):
 
     check_let_in(greeted_with(lab, "alice", password="pw-alice"))
     lab.root("vlmctl", "set", "enforceSmartCard", "1")
-    check_kept_out(greet(lab, "alice").end())
+    check_kept_out(Greeter(lab, "alice").end())
     lab.root("systemctl", "kill", "--signal=CONT", SERVICE)
     check_let_in(greeted_with(lab, "alice", pin="123456"))
 
@@ -49,7 +49,7 @@ def where_cards_are_required_nobody_gets_in_without_one(lab):
     lab.remove()
     lab.wait_until("it is gone", lambda: ALICE not in lab.root("vlmbind", "-i").output)
     for user in ("alice", "bob", "nobody-here"):
-        shown = greet(lab, user).end()
+        shown = Greeter(lab, user).end()
         check_kept_out(shown)
         check.assertIn("only a card", shown)
         check.assertNotRegex(shown, "[Pp]assword")
@@ -62,7 +62,7 @@ def where_others_are_allowed_only_paired_accounts_need_a_card(lab):
     lab.root("vlmctl", "set", "enforceSmartCard", "1")
     lab.root("vlmctl", "set", "allowUnmappedUsers", "1")
 
-    check_kept_out(greet(lab, "alice").end())
+    check_kept_out(Greeter(lab, "alice").end())
     check_let_in(greeted_with(lab, "bob", password="pw-bob"))
 
 
@@ -72,9 +72,9 @@ def root_gets_in_at_the_console_whatever_is_required(lab):
 
     check_let_in(greeted_with(lab, "root", "/dev/tty1", password="pw-root"))
     check_kept_out(greeted_with(lab, "root", "/dev/tty1", password="wrong"))
-    check_kept_out(greet(lab, "root", "/dev/pts/0").end())
-    check_kept_out(greet(lab, "root", ":0").end())
-    check_kept_out(greet(lab, "alice", "/dev/tty1").end())
+    check_kept_out(Greeter(lab, "root", "/dev/pts/0").end())
+    check_kept_out(Greeter(lab, "root", ":0").end())
+    check_kept_out(Greeter(lab, "alice", "/dev/tty1").end())
 
 
 def a_card_is_passed_over_where_none_is_allowed(lab):
