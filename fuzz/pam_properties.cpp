@@ -44,9 +44,9 @@ private:
     std::span<const std::uint8_t> _data;
 };
 
-// What the card is called ends neither the line nor its quotes.
-bool isHarmless(std::string_view shown) {
-    const bool isPrompt = shown.starts_with("PIN of the card");
+// What the card is called ends neither the line of a prompt nor its quotes.
+bool isHarmless(std::string_view shown, int style) {
+    const bool isPrompt = style == PAM_PROMPT_ECHO_OFF;
     return platform::harmlessText(shown, platform::kAllCharacters) == shown &&
            (!isPrompt || std::ranges::count(shown, '"') == 2);
 }
@@ -59,7 +59,7 @@ struct Application {
     static int converse(int, const pam_message** messages, pam_response** responses, void* self) {
         auto& application = *static_cast<Application*>(self);
         const std::string_view shown = messages[0]->msg;
-        if (!isHarmless(shown)) application.isTextHarmless = false;
+        if (!isHarmless(shown, messages[0]->msg_style)) application.isTextHarmless = false;
         auto& choices = application.choices;
         *responses = nullptr;
         if (choices.flag()) {
@@ -89,7 +89,7 @@ public:
         return _choices.flag() ? PAM_SUCCESS : PAM_SYSTEM_ERR;
     }
     Answer askSecretly(const std::string& prompt) override {
-        return conversation([&](const auto& with) { return with.askSecretly(prompt); });
+        return pam::Conversation(&_conv).askSecretly(prompt);
     }
     void inform(const std::string& text) override { tell(PAM_TEXT_INFO, text); }
     void warn(const std::string& text) override { tell(PAM_ERROR_MSG, text); }
@@ -107,17 +107,11 @@ public:
     std::optional<pam::LoggedIn> remembered() override { return std::nullopt; }
 
 private:
-    template <typename Use>
-    auto conversation(Use use) {
-        const pam_conv conv{Application::converse, &_application};
-        return use(pam::Conversation(&conv));
-    }
-    void tell(int style, const std::string& text) {
-        conversation([&](const auto& with) { with.tell(style, text); });
-    }
+    void tell(int style, const std::string& text) { pam::Conversation(&_conv).tell(style, text); }
 
     Choices& _choices;
     Application _application;
+    const pam_conv _conv{Application::converse, &_application};
     std::string _user;
 };
 
