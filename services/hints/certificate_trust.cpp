@@ -1,6 +1,7 @@
 #include "services/hints/certificate_trust.h"
 
 #include <algorithm>
+#include <utility>
 
 #include "platform/text.h"
 #include "services/hints/status.h"
@@ -22,13 +23,6 @@ X509Handle decode(const Bytes& der) {
     return at == der.data() + der.size() ? std::move(certificate) : nullptr;
 }
 
-std::vector<X509Handle> decodeAll(const std::vector<Bytes>& certificates) {
-    std::vector<X509Handle> decoded;
-    for (const auto& der : certificates)
-        if (auto certificate = decode(der)) decoded.push_back(std::move(certificate));
-    return decoded;
-}
-
 // The card's module tells the key and the certificate one by one, and is not believed.
 bool isFor(const X509* certificate, const Bytes& publicKeyHash) {
     EVP_PKEY* key = X509_get0_pubkey(certificate);
@@ -40,16 +34,7 @@ bool isFor(const X509* certificate, const Bytes& publicKeyHash) {
     return hash == publicKeyHash;
 }
 
-// What a verdict is about: the certificate, and what may lead from it to an issuer.
-Bytes digestOf(const Identity& identity, const Token& token) {
-    Bytes digests = sha256(identity.certificate);
-    digests.insert(digests.end(), identity.publicKeyHash.begin(), identity.publicKeyHash.end());
-    for (const auto& other : token.otherCertificates) {
-        const Bytes digest = sha256(other);
-        digests.insert(digests.end(), digest.begin(), digest.end());
-    }
-    return sha256(digests);
-}
+void append(const Bytes& some, Bytes& all) { all.insert(all.end(), some.begin(), some.end()); }
 
 // The next time after this one at which one of the certificates begins or ends to count.
 std::int64_t nextDate(const X509* certificate, std::int64_t now, std::int64_t next) {
@@ -60,6 +45,31 @@ std::int64_t nextDate(const X509* certificate, std::int64_t now, std::int64_t ne
 }
 
 }  // namespace
+
+// A card may hold thousands of identities beside them, so they are taken apart once, and only when
+// one of those is judged anew.
+class CertificateTrust::Others {
+public:
+    explicit Others(const std::vector<Bytes>& certificates) : _encoded(certificates) {
+        Bytes digests;
+        for (const auto& der : _encoded) append(sha256(der), digests);
+        _digest = sha256(digests);
+    }
+
+    const Bytes& digest() const { return _digest; }
+    const std::vector<X509Handle>& certificates() {
+        if (std::exchange(_isDecoded, true)) return _decoded;
+        for (const auto& der : _encoded)
+            if (auto certificate = decode(der)) _decoded.push_back(std::move(certificate));
+        return _decoded;
+    }
+
+private:
+    const std::vector<Bytes>& _encoded;
+    Bytes _digest;
+    bool _isDecoded = false;
+    std::vector<X509Handle> _decoded;
+};
 
 std::optional<Refusal> whyNotTrusted(const Identity& identity, std::int64_t now) {
     const auto refusal = [&identity](std::string_view why) {
@@ -77,9 +87,11 @@ void CertificateTrust::judge(std::vector<Token>& tokens, const MachineAnchors& m
                              std::int64_t now) {
     const QuietErrors quiet;
     refresh(machine);
-    for (auto& token : tokens)
+    for (auto& token : tokens) {
+        Others others(token.otherCertificates);
         for (auto& identity : token.identities)
-            identity.distrust = verdictOn(identity, token, now).whyNot;
+            identity.distrust = verdictOn(identity, others, now).whyNot;
+    }
 }
 
 void CertificateTrust::refresh(const MachineAnchors& machine) {
@@ -90,16 +102,19 @@ void CertificateTrust::refresh(const MachineAnchors& machine) {
 }
 
 const CertificateTrust::Verdict& CertificateTrust::verdictOn(const Identity& identity,
-                                                             const Token& token, std::int64_t now) {
-    const auto digest = digestOf(identity, token);
+                                                             Others& others, std::int64_t now) {
+    Bytes judged = sha256(identity.certificate);
+    append(identity.publicKeyHash, judged);
+    append(others.digest(), judged);
+    const auto digest = sha256(judged);
     const auto known = _verdicts.find(digest);
     if (known != _verdicts.end() && known->second.from <= now && now < known->second.until)
         return known->second;
     if (_verdicts.size() >= kMostVerdicts) _verdicts.clear();
-    return _verdicts[digest] = judge(identity, token, now);
+    return _verdicts[digest] = judge(identity, others, now);
 }
 
-CertificateTrust::Verdict CertificateTrust::judge(const Identity& identity, const Token& token,
+CertificateTrust::Verdict CertificateTrust::judge(const Identity& identity, Others& others,
                                                   std::int64_t now) const {
     Verdict verdict{{}, now, _verifier->nextDate(now)};
     const auto certificate = decode(identity.certificate);
@@ -108,10 +123,10 @@ CertificateTrust::Verdict CertificateTrust::judge(const Identity& identity, cons
     } else if (!isFor(certificate.get(), identity.publicKeyHash)) {
         verdict.whyNot = "it is for another key than the card's";
     } else {
-        const auto others = decodeAll(token.otherCertificates);
-        verdict.whyNot = _verifier->whyNot(certificate.get(), others, now);
+        verdict.whyNot = _verifier->whyNot(certificate.get(), others.certificates(), now);
         verdict.until = nextDate(certificate.get(), now, verdict.until);
-        for (const auto& other : others) verdict.until = nextDate(other.get(), now, verdict.until);
+        for (const auto& other : others.certificates())
+            verdict.until = nextDate(other.get(), now, verdict.until);
     }
     return verdict;
 }

@@ -6,7 +6,7 @@
 //
 // Threads:  one. Blocking: for the disk, for files that have changed.
 // Errors:   a certificate that cannot be judged is not trusted.
-// In tests: tests/unit/services/certificate_trust_test.cpp
+// In tests: tests/unit/services/trust/
 
 #pragma once
 
@@ -41,9 +41,11 @@ private:
         std::int64_t until = 0;  // and before then
     };
 
+    class Others;  // the card's other certificates
+
     void refresh(const MachineAnchors& machine);
-    const Verdict& verdictOn(const Identity& identity, const Token& token, std::int64_t now);
-    Verdict judge(const Identity& identity, const Token& token, std::int64_t now) const;
+    const Verdict& verdictOn(const Identity& identity, Others& others, std::int64_t now);
+    Verdict judge(const Identity& identity, Others& others, std::int64_t now) const;
 
     TrustFolder _folder;
     MachineAnchors _machine;

@@ -7,7 +7,7 @@
 // what its issuers issue, where that is said.
 //
 // Threads:  one. Blocking: no. Errors: sentences for people.
-// In tests: tests/unit/services/chain_verifier_test.cpp
+// In tests: tests/unit/services/trust/
 
 #pragma once
 

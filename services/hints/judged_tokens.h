@@ -1,7 +1,7 @@
 // JudgedTokens: the tokens with a judgement on each identity, where the machine asks for
 // certificates of issuers that it trusts. Where it does not, nothing is read for it.
 //
-// In tests: tests/unit/services/judged_tokens_test.cpp
+// In tests: tests/unit/services/trust/judged_tokens_test.cpp
 
 #pragma once
 

@@ -3,7 +3,7 @@
 //
 // Threads: any. Blocking: for the disk, never on a pipe or device.
 // Errors:  sentences for the log.
-// In tests: tests/unit/services/trust_folder_test.cpp
+// In tests: tests/unit/services/trust/trust_folder_test.cpp
 
 #pragma once
 

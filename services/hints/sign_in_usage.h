@@ -1,7 +1,7 @@
 // What a certificate says it is for. One that does not say is for anything.
 //
 // Threads: any. Errors: what cannot be read is for nothing.
-// In tests: tests/unit/services/chain_verifier_test.cpp
+// In tests: tests/unit/services/trust/certificate_trust_test.cpp
 
 #pragma once
 

@@ -10,7 +10,7 @@
 //            change.
 // Errors:    what does not count is a line in the log when it is read. A revocation list that does
 //            not count spoils them all: it may be the one that matters.
-// In tests:  tests/unit/services/trust_folder_test.cpp
+// In tests:  tests/unit/services/trust/trust_folder_test.cpp
 
 #pragma once
 

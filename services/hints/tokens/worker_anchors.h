@@ -26,7 +26,7 @@ namespace vlm::service {
 class WorkerAnchors final : public Anchors {
 public:
     static constexpr std::chrono::seconds kGoodFor{60};
-    static constexpr std::chrono::seconds kPatience{10};
+    static constexpr std::chrono::seconds kPatience{5};  // as long as whoever lists cards waits
 
     // The loop outlives this. Nothing is looked up before it is first read.
     WorkerAnchors(sd_event* event, WorkerTokensOptions options)

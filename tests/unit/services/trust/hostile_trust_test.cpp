@@ -60,12 +60,26 @@ TEST_F(HostileTrustTest, FindsTheWayAmongManyIssuersOfOneName) {
     inTime([&] { whyNot(alice, others); });
 }
 
+TEST_F(HostileTrustTest, JudgesACardThatIsFull) {
+    Token token;
+    token.identities.assign(4096, identityFor(alice));
+    for (auto& identity : token.identities)
+        identity.publicKeyHash[0] = static_cast<std::uint8_t>(&identity - token.identities.data());
+    token.otherCertificates.assign(31, Bytes(std::size_t{16} << 10U, 1));
+    token.otherCertificates.push_back(issuer.der());
+    std::vector<Token> tokens{token};
+
+    inTime([&] { trust.judge(tokens, machine, kToday); });
+    inTime([&] { trust.judge(tokens, machine, kToday); });
+}
+
 TEST_F(HostileTrustTest, LooksUpATenThousandthList) {
     for (int i = 0; i < 100; ++i) {
         const auto other = CertifiedKey::selfSigned(issuerCalled("Other " + std::to_string(i)));
-        const auto list = test::asText(other.revoke({}));
-        for (int k = 0; k < 100; ++k)
-            put("revoked/" + std::to_string(i) + "-" + std::to_string(k) + ".crl", list);
+        const auto list = test::pem(other.revoke({}), "X509 CRL");
+        std::string lists;
+        for (int k = 0; k < 100; ++k) lists += list;
+        put("revoked/" + std::to_string(i) + ".crl", lists);
     }
     put("revoked/issuer.crl", test::asText(issuer.revoke({.revoked = {alice.der()}})));
 
