@@ -115,9 +115,7 @@ def root_pairs_from_the_shell_and_the_user_is_asked_on_her_desktop(lab):
     paired = pair(lab, "alice", hash_)
 
     check.assertEqual(paired.status, 0, paired)
-    check.assertEqual(
-        paired.output, f"User was successfully paired (public key hash: {hash_}).\n"
-    )
+    check.assertEqual(paired.output, f"User was successfully paired (public key hash: {hash_}).\n")
     (question,) = lab.asked("keyring")
     check.assertIn("when alice logs in", question["desc"])
     check.assertEqual(unlock_keys(lab), [("alice", hash_)])
