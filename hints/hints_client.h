@@ -76,10 +76,10 @@ VLM_EXPORT vlm::platform::Status VLUnbindUser(
 VLM_EXPORT std::optional<vlm::platform::PropertyList::Array> VLCopyLegacyBindings(
     const std::optional<vlm::platform::String>& userName, bool flag);
 
-// Unlocks the user's key bag. The daemon when the user is not the one who runs this process, else
-// by rule.
+// Unlocks the user's key bag, which is the login keyring. The daemon when the user is not the one
+// who runs this process, else by rule.
 //   userId  whose; not 0
-//   text    passed on
+//   text    the keyring's password
 // Returns the service's status. -1000: the service failed or no status came back, or the text is
 // missing or cannot be sent; -1001: the user id is 0.
 VLM_EXPORT vlm::platform::Status VLUnlockKeybag(vlm::platform::UserId userId,

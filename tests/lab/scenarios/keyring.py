@@ -1,6 +1,8 @@
 """The unlock key: whom storing it asks, what is in the database then, and what a person is told when
 there is none."""
 
+import subprocess
+
 from machine.by_hand import pairings
 from machine.checks import check
 from machine.listing import pair, present, unpair
@@ -115,11 +117,27 @@ def root_pairs_from_the_shell_and_the_user_is_asked_on_her_desktop(lab):
     paired = pair(lab, "alice", hash_)
 
     check.assertEqual(paired.status, 0, paired)
-    check.assertEqual(
-        paired.output, f"User was successfully paired (public key hash: {hash_}).\n"
-    )
+    check.assertEqual(paired.output, f"User was successfully paired (public key hash: {hash_}).\n")
     (question,) = lab.asked("keyring")
     check.assertIn("when alice logs in", question["desc"])
+    check.assertEqual(unlock_keys(lab), [("alice", hash_)])
+
+
+def the_machine_s_own_pinentry_asks_again_after_a_wrong_password(lab):
+    hash_ = present(lab, "rsa", ALICE)
+    # Away with the one that answers by itself.
+    lab.root("mv", "/usr/local/bin/pinentry", "/usr/local/bin/pinentry.away")
+    command = lab.command_for(None, ["vlmbind", "-p", "-v", "-u", "alice", "-h", hash_])
+    asking = subprocess.Popen(command, stdout=subprocess.PIPE, text=True)
+
+    _type_into(lab, "Smart card", "123456")
+    _type_into(lab, "Login keyring", "wrong")
+    refused = "This password does not open your login keyring."
+    lab.wait_until("it is asked again", lambda: refused in lab.windows())
+    _type_into(lab, "Login keyring", "pw-alice")
+
+    output, _ = asking.communicate(timeout=30)
+    check.assertEqual(output, f"User was successfully paired (public key hash: {hash_}).\n")
     check.assertEqual(unlock_keys(lab), [("alice", hash_)])
 
 
@@ -211,6 +229,14 @@ def the_keyring_is_unlocked_by_a_password_through_the_service(lab):
     right = _unlock(lab, uid, "pw-alice")
     check.assertEqual(right.output, 'a{sv} 1 "res" x 0\n', right)
     check.assertFalse(is_locked(lab))
+
+
+def _type_into(lab, title: str, text: str) -> None:
+    lab.wait_until(f"{title} is there", lambda: f"dialog: {title}" in lab.windows())
+    window = ["search", "--sync", "--onlyvisible", "--name", f"^{title}$", "windowfocus", "--sync"]
+    lab.user("alice", "xdotool", *window)
+    lab.user("alice", "xdotool", "type", text)
+    lab.user("alice", "xdotool", "key", "Return")
 
 
 def _unlock(lab, uid: str, password: str):

@@ -180,7 +180,7 @@ def who_has_a_terminal_is_asked_there(lab):
     lab.root("mv", "/usr/local/bin/pinentry", "/usr/local/bin/pinentry.away")
 
     paired = lab.on_terminal(
-        None, ["vlmbind", "-p", "-v", "-u", "alice", "-h", hash_], {"PIN:": "123456\r"}
+        None, ["vlmbind", "-p", "-v", "-u", "bob", "-h", hash_], {"PIN:": "123456\r"}
     )
 
     check.assertEqual(paired.status, 0, paired)

@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <iterator>
 
+#include "pinentry_conversation.h"
+
 namespace vlm::service {
 namespace {
 
@@ -17,23 +19,6 @@ using testing::Not;
 
 PinentryForm question(PinState state = PinState::Ready) {
     return pinForm({"PIV Card", "Alice", state, "alice", {}});
-}
-PinentryForm passwordTwice() {
-    PasswordQuestion question{"PIV Card", "alice"};
-    question.isTypedTwice = true;
-    return passwordForm(question);
-}
-
-// Everything that we say to a program that answers OK to all of it, up to the request for the PIN.
-std::vector<std::string> sayAll(PinentryDialog& dialog) {
-    std::vector<std::string> said;
-    auto line = dialog.take("OK Pleased to meet you");
-    while (!line.empty()) {
-        said.push_back(line);
-        if (line == "GETPIN\n") break;
-        line = dialog.take("OK");
-    }
-    return said;
 }
 
 TEST(PinentryDialogTest, SaysItsWishesInOrderAndThenAsksForThePin) {
@@ -174,75 +159,6 @@ TEST(PinentryDialogTest, TakesTheLongestPin) {
     dialog.take("OK");
 
     EXPECT_EQ(dialog.takeAnswer().pin.text().size(), 256u);
-}
-
-TEST(PinentryDialogTest, AsksForThePasswordOfAKeyringAndNamesCardAndAccount) {
-    PinentryDialog dialog(passwordForm({"PIV Card", "alice"}), std::nullopt);
-
-    EXPECT_THAT(
-        sayAll(dialog),
-        ElementsAre("OPTION lc-ctype=C.UTF-8\n", "SETTIMEOUT 600\n", "SETTITLE Login keyring\n",
-                    "SETDESC Enter the password of your login keyring, once, so that the "
-                    "card \"PIV Card\" can open it from now on when alice logs in with "
-                    "it. As a rule it is your login password.\n",
-                    "SETPROMPT Password:\n", "GETPIN\n"));
-}
-
-TEST(PinentryDialogTest, SaysThatThePasswordBeforeWasWrong) {
-    PasswordQuestion again{"PIV Card", "alice"};
-    again.wasRefused = true;
-    PinentryDialog dialog(passwordForm(again), std::nullopt);
-
-    EXPECT_THAT(sayAll(dialog),
-                Contains("SETERROR This password does not open your login keyring.\n"));
-}
-
-TEST(PinentryDialogTest, LetsAPasswordThatNothingChecksBeTypedTwice) {
-    PinentryDialog dialog(passwordTwice(), std::nullopt);
-
-    const auto said = sayAll(dialog);
-    EXPECT_THAT(said, Contains("SETREPEAT Again:\n"));
-    EXPECT_THAT(said, Contains(HasSubstr("asked for twice")));
-
-    dialog.take("D secret");
-    dialog.take("S PIN_REPEATED");
-    dialog.take("OK");
-    EXPECT_EQ(dialog.takeAnswer().pin.text(), "secret");
-}
-
-TEST(PinentryDialogTest, TakesNoPasswordFromAProgramThatCannotAskTwice) {
-    PinentryDialog dialog(passwordTwice(), std::nullopt);
-    sayAll(dialog);
-
-    dialog.take("D secret");
-    dialog.take("OK");
-
-    const auto answer = dialog.takeAnswer();
-    EXPECT_EQ(answer.outcome, Outcome::Unavailable);
-    EXPECT_TRUE(answer.pin.empty());
-    EXPECT_THAT(answer.reason, HasSubstr("does not ask twice"));
-}
-
-TEST(PinentryDialogTest, TakesAPasswordThatIsLongerThanAnyPin) {
-    PinentryDialog dialog(passwordForm({"PIV Card", "alice"}), std::nullopt);
-    sayAll(dialog);
-
-    dialog.take("D " + std::string(900, 'x'));
-    dialog.take("D " + std::string(124, 'y'));
-    dialog.take("OK");
-
-    EXPECT_EQ(dialog.takeAnswer().pin.text().size(), 1024u);
-}
-
-TEST(PinentryDialogTest, TakesNoPasswordThatIsTooLong) {
-    PinentryDialog dialog(passwordForm({"PIV Card", "alice"}), std::nullopt);
-    sayAll(dialog);
-
-    dialog.take("D " + std::string(900, 'x'));
-    dialog.take("D " + std::string(125, 'y'));
-    dialog.take("OK");
-
-    EXPECT_EQ(dialog.takeAnswer().outcome, Outcome::Unavailable);
 }
 
 TEST(PinentryDialogTest, AsksAlsoWhenTheProgramKnowsNoneOfItsWishes) {
