@@ -20,7 +20,8 @@ TEST_F(PamFuzzCorpusTest, LetsNobodyInWithoutTheServicesWord) {
     for (const auto& entry : std::filesystem::directory_iterator(
              std::filesystem::path(VLM_FUZZ_CORPUS) / "pam_conversation")) {
         std::ifstream file(entry.path(), std::ios::binary);
-        const platform::Bytes data(std::istreambuf_iterator(file), {});
+        const platform::Bytes data{std::istreambuf_iterator<char>(file),
+                                   std::istreambuf_iterator<char>()};
         EXPECT_TRUE(pamConversationIsSound(data)) << entry.path();
         ++seeds;
     }
