@@ -32,9 +32,13 @@ public:
     }
     bool flag() { return byte() % 2 != 0; }
     // Every status is among them.
-    std::int64_t number() { return std::int64_t{byte()} - 2200 + (flag() ? 2200 : 0); }
+    std::int64_t number() {
+        const std::int64_t low = byte();
+        return flag() ? low : low - 2200;
+    }
     std::string text() {
-        const auto size = std::min<std::size_t>(byte() * 2, _data.size());
+        const std::size_t wanted = std::size_t{byte()} * 2;
+        const auto size = std::min(wanted, _data.size());
         std::string taken(_data.begin(), _data.begin() + static_cast<std::ptrdiff_t>(size));
         _data = _data.subspan(size);
         return taken;

@@ -28,8 +28,26 @@ const char* nameOf(Found::Kind kind) {
 
 int Authentication::run() {
     transaction().forget();
+    const bool isFromAfar = !transaction().remoteHost().empty();
     const auto user = transaction().user();
-    return user.empty() ? logInNobodyInParticular() : logIn(user);
+    if (user.empty()) return isFromAfar ? askAndLogInFromAfar() : logInNobodyInParticular();
+    return isFromAfar ? logInFromAfar(user) : logIn(user);
+}
+
+// Who comes over the network has no card in this machine. What is typed there must never reach the
+// card that somebody else has in it: a few wrong passwords would lock it.
+int Authentication::logInFromAfar(const std::string& account) {
+    const auto found = search(account);
+    if (found.kind == Found::Kind::Card) return usePassword(account, found.card);
+    if (found.kind != Found::Kind::Refused && found.kind != Found::Kind::PinLocked)
+        return withoutCard(account, found);
+    if (!_parts.requiresCard(account)) return PAM_AUTHINFO_UNAVAIL;
+    return refuseForWantOfCard(account, PAM_AUTH_ERR, kOnlyACard);
+}
+
+int Authentication::askAndLogInFromAfar() {
+    const int asked = transaction().askForUser();
+    return asked == PAM_SUCCESS ? logInFromAfar(transaction().user()) : asked;
 }
 
 // The card may say who it is. Where it does not, the person is asked, and the rules for that

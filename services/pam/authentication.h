@@ -40,6 +40,8 @@ public:
 private:
     int logInNobodyInParticular();
     int logIn(const std::string& account);
+    int logInFromAfar(const std::string& account);
+    int askAndLogInFromAfar();
     int logInWith(const std::string& account, const FoundCard& card);
     int prove(const std::string& account, const FoundCard& card, const service::Secret* pin);
     int letIn(const std::string& account, const FoundCard& card, const LoginAnswer& answer);

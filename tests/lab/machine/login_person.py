@@ -133,9 +133,17 @@ class Greeter(Terminal):
     AND_SAY_WHEN_DONE = '"$@"; echo "(ended with $?)"; read -r wait'
     DONE = re.compile(r"\(ended with \d+\)")
 
-    def __init__(self, lab, user: str, terminal: str = ":0", environment: str = "LANG=C") -> None:
+    def __init__(
+        self,
+        lab,
+        user: str,
+        terminal: str = ":0",
+        environment: str = "LANG=C",
+        remote_host: str = "",
+    ) -> None:
+        items = ["-I", f"tty={terminal}", *(["-I", f"rhost={remote_host}"] if remote_host else [])]
         what = ["lab-display-manager", user, "authenticate", "acct_mgmt"]
-        program = ["env", environment, "pamtester", "-I", f"tty={terminal}", *what]
+        program = ["env", environment, "pamtester", *items, *what]
         super().__init__(lab, "sh", "-c", self.AND_SAY_WHEN_DONE, "sh", *program)
 
     def end(self) -> str:
@@ -143,10 +151,10 @@ class Greeter(Terminal):
         return super().end()
 
 
-def greeted_with(lab, user: str, terminal: str = ":0", **typed: str) -> str:
+def greeted_with(lab, user: str, terminal: str = ":0", remote_host: str = "", **typed: str) -> str:
     """What the greeter shows when the person types these answers, a PIN or a password."""
     prompts = {"pin": PIN_PROMPT, "password": PASSWORD_PROMPT}
-    greeter = Greeter(lab, user, terminal)
+    greeter = Greeter(lab, user, terminal, remote_host=remote_host)
     for which, text in typed.items():
         greeter.answer(prompts[which], text)
     return greeter.end()

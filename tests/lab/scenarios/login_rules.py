@@ -77,6 +77,21 @@ def root_gets_in_at_the_console_whatever_is_required(lab):
     check_kept_out(Greeter(lab, "alice", "/dev/tty1").end())
 
 
+def a_login_from_afar_costs_the_card_in_this_machine_no_try(lab):
+    turn_on(lab)
+    pair(lab, "alice", ALICE, "rsa")
+    before = lab.card_ctl("tries", "rsa")
+
+    shown = greeted_with(lab, "alice", "ssh", remote_host="far.away", password="wrong")
+
+    check_kept_out(shown)
+    check.assertNotIn("PIN", shown)
+    check.assertEqual(lab.card_ctl("tries", "rsa"), before)
+    check_let_in(greeted_with(lab, "alice", "ssh", remote_host="far.away", password="pw-alice"))
+    lab.root("vlmctl", "set", "enforceSmartCard", "1")
+    check_kept_out(Greeter(lab, "alice", "ssh", remote_host="far.away").end())
+
+
 def a_card_is_passed_over_where_none_is_allowed(lab):
     turn_on(lab)
     pair(lab, "alice", ALICE, "rsa")

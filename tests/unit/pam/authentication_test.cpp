@@ -220,6 +220,44 @@ TEST_F(AuthenticationTest, KeepsTheWayBackInOpenForRootAtTheConsole) {
     }
 }
 
+TEST_F(AuthenticationTest, AsksNobodyFromAfarForThePinOfACardInThisMachine) {
+    struct {
+        const char* why;
+        Reply found;
+        bool isCardRequired;
+        int result;
+    } const rows[] = {
+        {"a card", card(), false, PAM_AUTHINFO_UNAVAIL},
+        {"a card, required", card(kRequired), false, PAM_AUTH_ERR},
+        {"a card on its last try", card(4), false, PAM_AUTHINFO_UNAVAIL},
+        {"a card in a reader with a pad", card(1), false, PAM_AUTHINFO_UNAVAIL},
+        {"a locked card", refusal(-2009), false, PAM_AUTHINFO_UNAVAIL},
+        {"a locked card, required", refusal(-2009), true, PAM_AUTH_ERR},
+        {"an expired card", refusal(-2020), false, PAM_AUTHINFO_UNAVAIL},
+        {"no card", refusal(-2018), false, PAM_AUTHINFO_UNAVAIL},
+        {"no card, required", refusal(-2019), false, PAM_AUTH_ERR},
+        {"no service, required", silence(), true, PAM_AUTH_ERR},
+    };
+    for (const auto& row : rows) {
+        for (const bool isNamed : {true, false}) {
+            SCOPED_TRACE(row.why);
+            transaction = fakes::FakeTransaction();
+            isNamed ? transaction.name("alice") : transaction.willNameThemselves("alice");
+            transaction.willType("123456");
+            transaction.beAt("ssh", "far.away");
+            service = ScriptedService();
+            service.answer(kSearch, row.found);
+            isCardRequired = row.isCardRequired;
+
+            EXPECT_EQ(run(), row.result);
+
+            ASSERT_EQ(service.requests.size(), 1u) << "no card is asked";
+            EXPECT_EQ(*service.requests[0].text("str1"), "alice");
+            EXPECT_EQ(transaction.prompts.size(), isNamed ? 0u : 1u);
+        }
+    }
+}
+
 TEST_F(AuthenticationTest, OpensNoWayForRootWithACardThatIsNotAccepted) {
     transaction.name("root");
     transaction.beAt("tty1");
