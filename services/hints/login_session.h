@@ -29,7 +29,7 @@ public:
         : _sessions(sessions), _caller(std::move(caller)) {}
 
     // Calls `answer` once: at once for root, else later.
-    void check(const Request& request, Answer answer) {
+    void check(const Request& request, const Answer& answer) {
         if (_caller.isRoot()) return answer(std::nullopt);
         const auto refusal =
             refused(status::kUnattended, request,

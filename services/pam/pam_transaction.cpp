@@ -81,7 +81,7 @@ std::string PamTransaction::sessionId() {
 int PamTransaction::remember(const LoggedIn& login) {
     auto kept = std::make_unique<LoggedIn>(login);
     const int result = pam_set_data(_handle, kLogin, kept.get(), forgetLogin);
-    if (result == PAM_SUCCESS) kept.release();
+    if (result == PAM_SUCCESS) static_cast<void>(kept.release());
     return result;
 }
 
