@@ -1,13 +1,17 @@
 """What others see of PINs and pairings: nothing, whatever becomes of the processes."""
 
 import json
+import time
 
 from machine.attack import TOOLS, daemon_pid, instance_pid
 from machine.checks import check
 from machine.hints_daemon import SERVICE
 from machine.listing import pair, present
+from machine.login_keyring import unlock_keys
+from machine.login_person import check_let_in, greeted_with, turn_on
 
-PIN = "123456"
+PIN, PASSWORD = "123456", "pw-alice"
+SEARCH = f"{TOOLS}/search-memory"
 
 
 def the_files_are_closed(lab):
@@ -81,6 +85,31 @@ def a_pin_is_in_no_log_and_on_no_session_bus(lab):
         # The journal's own numbers may hold any digits.
         said = {key: text for key, text in entry.items() if not key.startswith("_")}
         check.assertNotIn(PIN, str(said))
+
+
+def what_logs_in_is_in_no_memory_a_second_later(lab):
+    turn_on(lab)
+    hash_ = present(lab, "rsa", "Alice Archer")
+    lab.answer("keyring", f"password {PASSWORD}")
+    check.assertEqual(pair(lab, "alice", hash_).status, 0)
+    check.assertEqual(unlock_keys(lab), [("alice", hash_)])
+    _check_forgotten(lab)
+
+    check_let_in(greeted_with(lab, "alice", pin=PIN))
+
+    _check_forgotten(lab)
+
+
+def _check_forgotten(lab) -> None:
+    time.sleep(1)
+    pids = [pid for _, pid in _holders(lab)]
+    # The search itself works: the processes' names are in them.
+    found = lab.container.run([SEARCH, "vlmhintsd", *pids], capture_output=True, text=True).stdout
+    check.assertTrue({pids[0], pids[-1]} <= {line.split()[0] for line in found.splitlines()})
+    for secret in (PIN, PASSWORD):
+        # Not by systemd, which would tell its own bus what is looked for.
+        found = lab.container.run([SEARCH, secret, *pids], capture_output=True, text=True)
+        check.assertEqual((found.returncode, found.stdout), (0, ""), found)
 
 
 def _holders(lab) -> list[tuple[str, str]]:
