@@ -112,9 +112,14 @@ TEST_P(ByHandTest, OpensNothingForAnotherAccount) {
 
 // The software module has no OAEP with SHA-256; the one in front of it has.
 TEST_P(ByHandTest, OpensWithTheCommandsOfTheDocument) {
+    const bool needsOaep = GetParam().scheme == WrapScheme::RsaOaepSha256;
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+    if (needsOaep) GTEST_SKIP() << "pkcs11-tool cannot load a module that a sanitizer watches";
+#endif
     auto variables = environment();
     variables["FORM"] = wrappedHere();
-    variables["MODULE"] = VLM_TEST_MODULES "/opening_module.so";
+    variables["MODULE"] =
+        needsOaep ? VLM_TEST_MODULES "/opening_module.so" : SoftCards::modulePath();
     variables["VLM_TEST_OPENING"] = "all";
     variables["TOKEN"] = "card";
     variables["ID"] = "0001";
