@@ -123,7 +123,7 @@ void addStamps(const std::string& folder, FileStamps& stamps) {
         if (platform::isSettled(status.st_ctim, now)) stamp = platform::FileStamp::of(status);
     };
     add(folder);
-    for (const auto& name : namesIn(folder)) add(folder + "/" + name);
+    for (const auto& name : namesIn(folder)) add(platform::text("{}/{}", folder, name));
 }
 
 }  // namespace vlm::service

@@ -45,7 +45,8 @@ bool isAtEnd() { return ERR_GET_REASON(ERR_peek_last_error()) == PEM_R_NO_START_
 // The parts of a file, in DER, that are called so in PEM; none for a file that is broken.
 std::optional<std::vector<Bytes>> partsOf(const Bytes& content, std::string_view kind) {
     constexpr std::string_view kBegin = "-----BEGIN ";
-    if (std::ranges::search(content, kBegin).empty()) return std::vector<Bytes>{content};
+    if (std::search(content.begin(), content.end(), kBegin.begin(), kBegin.end()) == content.end())
+        return std::vector<Bytes>{content};
     const BioHandle text(BIO_new_mem_buf(content.data(), static_cast<int>(content.size())));
     std::vector<Bytes> parts;
     while (auto part = text ? nextPart(text.get()) : std::nullopt)

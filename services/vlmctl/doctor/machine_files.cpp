@@ -4,6 +4,7 @@
 #include <filesystem>
 #include <system_error>
 
+#include "platform/text.h"
 #include "services/vlmctl/read_file.h"
 
 namespace vlm::control::doctor {
@@ -50,11 +51,11 @@ std::vector<std::string> installed(const std::string& path) {
 std::vector<std::string> amongLibraries(const MachineFiles& files, const std::string& path) {
     std::vector<std::string> paths;
     for (const std::string folder : {"/usr/lib", "/usr/local/lib", "/lib", "/usr/lib64"}) {
-        paths.push_back(folder + "/" + path);
+        paths.push_back(platform::text("{}/{}", folder, path));
         // The libraries of each processor may have a folder of their own.
         for (const auto& name : files.names(folder))
             if (name.find("-linux-") != std::string::npos)
-                paths.push_back(folder + "/" + name + "/" + path);
+                paths.push_back(platform::text("{}/{}/{}", folder, name, path));
     }
     return paths;
 }
