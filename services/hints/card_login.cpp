@@ -57,7 +57,9 @@ void CardLogin::prove(const std::vector<Token>& inserted) {
                                          _proved = std::move(*proved);
                                          finish();
                                      });
-    _login->start();
+    // Whoever ends the login lets go of it.
+    const auto login = _login;
+    login->startAmong(inserted);
 }
 
 std::optional<OpenRequest> CardLogin::unlockKeyTask() {

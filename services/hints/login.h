@@ -58,6 +58,9 @@ public:
 
     void start();
 
+    // Likewise, among cards that were listed just now; here `done` may be called at once.
+    void startAmong(const std::vector<Token>& inserted) { choose(inserted); }
+
 private:
     void choose(const std::vector<Token>& tokens);
     void askForPin();

@@ -2,8 +2,8 @@
 //
 // What can be refused without asking anybody is refused first: the user, a pairing that is not
 // there, a card that is not in or whose wrap key is another one. Only then the person is asked for
-// the keyring's password, so nobody is in vain. The password is wrapped for the card at once and
-// kept nowhere else.
+// the keyring's password, so nobody is asked in vain. The password is wrapped for the card at once
+// and kept nowhere else.
 //
 // Ownership: by a shared pointer; dropping it withdraws the question, and nothing is stored.
 // Threads:   the event loop's. Blocking: for the database only.

@@ -6,9 +6,9 @@
 #include <optional>
 
 #include "platform/property_list.h"
-#include "services/hints/request.h"
 #include "services/hints/secret_pipe.h"
 #include "services/hints/status.h"
+#include "services/pam/login_requests.h"
 
 namespace vlm::pam {
 
@@ -19,12 +19,6 @@ using service::Operation;
 
 constexpr platform::PropertyListLimits kPairingsLimits = {
     .depth = 4, .objects = 4096, .bytes = std::size_t{1} << 20U};
-
-Message requestOf(Operation operation) {
-    Message request;
-    request.set("op", static_cast<std::uint64_t>(operation));
-    return request;
-}
 
 bool isDone(const std::optional<Message>& reply) {
     return reply && reply->integer("res") == service::status::kSuccess;

@@ -9,7 +9,6 @@
 #include "platform/harmless_text.h"
 #include "platform/token_framework.h"
 #include "services/hints/login_card_flags.h"
-#include "services/hints/request.h"
 #include "services/hints/secret_pipe.h"
 #include "services/hints/status.h"
 
@@ -25,12 +24,6 @@ namespace status = service::status;
 constexpr std::size_t kHashSize = 32;
 constexpr std::size_t kMostNameCharacters = 64;
 constexpr std::size_t kMostTextCharacters = 512;
-
-Message requestOf(Operation operation) {
-    Message request;
-    request.set("op", static_cast<std::uint64_t>(operation));
-    return request;
-}
 
 std::string errorText(const Message& reply) {
     std::optional<platform::Error> error;
@@ -83,6 +76,12 @@ Found::Kind kindOf(std::int64_t status) {
 }
 
 }  // namespace
+
+Message requestOf(Operation operation) {
+    Message request;
+    request.set("op", static_cast<std::uint64_t>(operation));
+    return request;
+}
 
 Message cardSearch(const std::string& account) {
     auto request = requestOf(Operation::FindLoginCard);

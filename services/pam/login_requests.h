@@ -13,6 +13,7 @@
 
 #include "platform/message.h"
 #include "platform/types.h"
+#include "services/hints/request.h"
 #include "services/hints/secret.h"
 
 namespace vlm::pam {
@@ -42,6 +43,9 @@ struct Found {
     FoundCard card{};
     std::string text{};  // for the person
 };
+
+// A request without its arguments.
+platform::Message requestOf(service::Operation operation);
 
 // Empty for the account that the inserted cards belong to.
 platform::Message cardSearch(const std::string& account);
